@@ -1,0 +1,11 @@
+# Warning and sanitizer flags shared by every target of the project.
+add_library(tsd_compile_options INTERFACE)
+target_compile_options(tsd_compile_options INTERFACE -Wall -Wextra)
+if(TSD_WARNINGS_AS_ERRORS)
+  target_compile_options(tsd_compile_options INTERFACE -Werror)
+endif()
+if(TSD_SANITIZE)
+  set(_tsd_san -fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  target_compile_options(tsd_compile_options INTERFACE ${_tsd_san})
+  target_link_options(tsd_compile_options INTERFACE ${_tsd_san})
+endif()

@@ -1,0 +1,9 @@
+// Umbrella header of the timing-specification database.
+#pragma once
+
+#include "tsd/host/DumpStream.h"
+#include "tsd/host/Messages.h"
+
+#include "tsd/Tsd_BaseObj.h"
+#include "tsd/Tsd_Specs.h"
+#include "tsd/Tsd_StaticBuf.h"

@@ -1,0 +1,211 @@
+// The common base of every group and specification, the reference records
+// that tools attach to them, and the pointer lists the database is built on.
+//
+// Lists keep their slots: removal clears a slot and never compacts, and every
+// iterator skips cleared slots, so removing while walking is safe and list
+// order is insertion order.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <vector>
+
+class DumpStream;
+
+class Tsd_BaseObj;
+class Tsd_Ref;
+class Tsd_Group;
+class Tsd_TermGroup;
+class Tsd_PredefGroup;
+class Tsd_TNMGroup;
+class Tsd_UserGroup;
+class Tsd_SyncGroup;
+class Tsd_ThruGroup;
+class Tsd_TIGGroup;
+class Tsd_ClkGroup;
+class Tsd_Spec;
+class Tsd_EndpointSpec;
+class Tsd_DelayPath;
+class Tsd_Period;
+class Tsd_NetTiming;
+class Tsd_Offset;
+class Tsd_NetOffset;
+class Tsd_GroupOffset;
+class Tsd_PathControl;
+class Tsd_PortTiming;
+
+// A growable array of pointers that never owns what its slots point to.
+// Slots 0 to getCount()-1 may be read; a slot may hold null.
+template <class T>
+class Tsd_DArray {
+public:
+    explicit Tsd_DArray(int initialCapacity = 10) {
+        if (initialCapacity > 0)
+            m_slots.reserve(static_cast<std::size_t>(initialCapacity));
+    }
+
+    int getCount() const { return static_cast<int>(m_slots.size()); }
+    // Slot i, or null when i is outside 0..getCount()-1.
+    T* getAt(int i) const {
+        return i >= 0 && i < getCount() ? m_slots[static_cast<std::size_t>(i)] : nullptr;
+    }
+    T* operator[](int i) const { return getAt(i); }
+    // Stores p in slot i; ignored when i is outside 0..getCount()-1.
+    void setAt(int i, T* p) {
+        if (i >= 0 && i < getCount())
+            m_slots[static_cast<std::size_t>(i)] = p;
+    }
+    void append(T* p) { m_slots.push_back(p); }
+    // Sets the count (the storage is kept); new slots, if any, are null.
+    void reset(int count) { m_slots.resize(count > 0 ? static_cast<std::size_t>(count) : 0u); }
+    // Removes slot i; the later slots move up by one.
+    void removeAt(int i) {
+        if (i >= 0 && i < getCount())
+            m_slots.erase(m_slots.begin() + i);
+    }
+
+private:
+    std::vector<T*> m_slots;
+};
+
+using DARRAY_Tsd_RefPtr = Tsd_DArray<Tsd_Ref>;
+using DARRAY_Tsd_BaseObjPtr = Tsd_DArray<Tsd_BaseObj>;
+
+class Tsd_RefList : public DARRAY_Tsd_RefPtr {
+public:
+    explicit Tsd_RefList(int initialCapacity = 10) : DARRAY_Tsd_RefPtr(initialCapacity) {}
+
+    bool addRef(Tsd_Ref* ref);     // false for null; duplicates are stored again
+    bool removeRef(Tsd_Ref* ref);  // clears the first slot holding ref
+    bool isEmpty() const;          // no slot, or every slot cleared
+    Tsd_Ref* getSingleRef() const; // the one non-null slot, else null
+    void emptyList();              // count 0; the references are untouched
+
+    // Destroys every reference still held (each once, even if it stands in
+    // several slots) and empties the list. Used by the owners' destructors.
+    void deleteAllRefs();
+};
+
+class Tsd_BaseObjList : public DARRAY_Tsd_BaseObjPtr {
+public:
+    explicit Tsd_BaseObjList(int initialCapacity = 10) : DARRAY_Tsd_BaseObjPtr(initialCapacity) {}
+
+    bool addObj(Tsd_BaseObj* obj);
+    bool removeObj(Tsd_BaseObj* obj);
+    bool isEmpty() const;
+    void emptyList();
+    // True when obj stands in a slot (compared by address); false for null.
+    bool contains(const Tsd_BaseObj* obj) const;
+};
+
+class Tsd_RefListIter {
+public:
+    explicit Tsd_RefListIter(const Tsd_RefList* list) : m_list(list), m_index(0) {}
+    // Walks holder->getRefList(); an object without references yields nothing.
+    explicit Tsd_RefListIter(Tsd_BaseObj* holder);
+
+    Tsd_Ref* next();
+
+private:
+    const Tsd_RefList* m_list;
+    std::int32_t m_index;
+};
+
+class Tsd_BaseObjListIter {
+public:
+    explicit Tsd_BaseObjListIter(const Tsd_BaseObjList* list) : m_list(list), m_index(0) {}
+    virtual ~Tsd_BaseObjListIter() = default;
+
+    Tsd_BaseObj* next();
+
+protected:
+    const Tsd_BaseObjList* getObjArray() const { return m_list; }
+
+private:
+    const Tsd_BaseObjList* m_list;
+    std::int32_t m_index;
+};
+
+class Tsd_BaseObj {
+public:
+    virtual ~Tsd_BaseObj();
+
+    virtual Tsd_RefList* getRefList();
+    virtual Tsd_Group* getGroup();
+    virtual Tsd_TermGroup* getTermGroup();
+    virtual Tsd_PredefGroup* getPredefGroup();
+    virtual Tsd_TNMGroup* getTNMGroup();
+    virtual Tsd_UserGroup* getUserGroup();
+    virtual Tsd_SyncGroup* getSyncGroup();
+    virtual Tsd_ThruGroup* getThruGroup();
+    virtual Tsd_TIGGroup* getTIGGroup();
+    virtual Tsd_ClkGroup* getClkGroup();
+    virtual Tsd_Spec* getSpec();
+    virtual Tsd_EndpointSpec* getEndpointSpec();
+    virtual Tsd_DelayPath* getDelayPath();
+    virtual Tsd_Period* getPeriod();
+    virtual Tsd_NetTiming* getNetTiming();
+    virtual Tsd_Offset* getOffset();
+    virtual Tsd_NetOffset* getNetOffset();
+    virtual Tsd_GroupOffset* getGroupOffset();
+    virtual Tsd_PathControl* getPathControl();
+    virtual Tsd_PortTiming* getPortTiming();
+    // The canonical property; the texts stay valid until the next getProp of
+    // the same family (groups or specifications).
+    virtual bool getProp(const char*& name, const char*& value) const;
+    // "name=value" with ':' as blanks; valid until the next getUserString.
+    virtual const char* getUserString() const;
+    virtual const char* getTIGid() const;
+    virtual void dump(DumpStream& stream, short indent) const;
+
+    // True for the eight classes that hold references.
+    bool refOwner() const;
+    void addRef(Tsd_Ref* ref);
+    void trimRef(Tsd_Ref* ref, bool report);
+
+protected:
+    Tsd_BaseObj() = default;
+    Tsd_BaseObj(const Tsd_BaseObj&) = default;
+    Tsd_BaseObj& operator=(const Tsd_BaseObj&) = delete;
+};
+
+// A reference record: the caller's object for one design element that carries
+// a reference property. It belongs to at most one owner, which destroys it.
+class Tsd_Ref {
+public:
+    virtual ~Tsd_Ref();
+    // Whether both stand for the same design element; false in the base.
+    virtual bool isEqual(const Tsd_Ref* other) const;
+    virtual void dump(DumpStream& stream, short indent) const;
+
+    Tsd_BaseObj* getOwner() const { return m_owner; }
+    // Leaves the old owner's list (a hole stays) and joins newOwner's.
+    void setOwner(Tsd_BaseObj* newOwner);
+
+    // Leave the owner and destroy this reference; it must not be used after.
+    void trim();
+    void trimNoReport();
+
+    bool isTIG() const;
+    bool isSync() const;
+    bool isTNM() const;
+    bool isThru() const;
+    const char* getTIGid() const;
+    const char* getUserString() const;
+
+protected:
+    Tsd_Ref() : m_owner(nullptr) {}
+    // A copy starts unowned; copyTo makes it join the original's owner.
+    Tsd_Ref(const Tsd_Ref&) : m_owner(nullptr) {}
+    Tsd_Ref& operator=(const Tsd_Ref&) = delete;
+
+    void copyTo(Tsd_Ref* copy) const;
+    bool isRedundant(const Tsd_Ref* other) const;
+
+private:
+    // The owner, required by the owner queries and trimming.
+    Tsd_BaseObj& requireOwner(const char* operation) const;
+    void trimWith(bool report);
+
+    Tsd_BaseObj* m_owner;
+};
