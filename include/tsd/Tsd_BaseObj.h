@@ -8,6 +8,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <vector>
 
 class DumpStream;
@@ -33,6 +34,31 @@ class Tsd_NetOffset;
 class Tsd_GroupOffset;
 class Tsd_PathControl;
 class Tsd_PortTiming;
+
+// An owned copy of a zero-terminated string that may be null: the type of
+// every name, TSid, scope and similar text that an object keeps.
+class Tsd_String {
+public:
+    Tsd_String() = default;
+    explicit Tsd_String(const char* text) { set(text); }
+    Tsd_String(const Tsd_String& other) { set(other.get()); }
+    Tsd_String& operator=(const Tsd_String& other) {
+        if (this != &other)
+            set(other.get());
+        return *this;
+    }
+    Tsd_String(Tsd_String&&) noexcept = default;
+    Tsd_String& operator=(Tsd_String&&) noexcept = default;
+
+    // Replaces the text by a copy of `text` (null stays null); `text` may
+    // point into the current text.
+    void set(const char* text);
+    const char* get() const { return m_text.get(); }
+    bool isNull() const { return m_text == nullptr; }
+
+private:
+    std::unique_ptr<char[]> m_text;
+};
 
 // A growable array of pointers that never owns what its slots point to.
 // Slots 0 to getCount()-1 may be read; a slot may hold null.

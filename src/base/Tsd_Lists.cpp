@@ -1,6 +1,8 @@
 // Reference lists, object lists and their iterators.
 #include "tsd/Tsd_BaseObj.h"
 
+#include <cstring>
+
 namespace {
 
 // Clears the first slot of `array` that holds p.
@@ -123,4 +125,15 @@ Tsd_Ref* Tsd_RefListIter::next() {
 
 Tsd_BaseObj* Tsd_BaseObjListIter::next() {
     return nextSlot(m_list, m_index);
+}
+
+void Tsd_String::set(const char* text) {
+    if (text == nullptr) {
+        m_text.reset();
+        return;
+    }
+    size_t n = std::strlen(text);
+    auto copy = std::make_unique<char[]>(n + 1);
+    std::memcpy(copy.get(), text, n + 1);
+    m_text = std::move(copy);
 }

@@ -1,5 +1,6 @@
 #include "tsd/Tsd_StaticBuf.h"
 
+#include "internal/Tsd_PropBuffers.h"
 #include "internal/Tsd_Report.h"
 
 #include <cctype>
@@ -98,3 +99,23 @@ const char* Tsd_Util::getAnnoName(const char* name) {
         buffer.cat("\"");
     return buffer.getBuffer();
 }
+
+namespace tsd_detail {
+
+// Built when the library is loaded; a function-level static keeps them safe
+// from the order in which other static objects are initialised.
+PropBuffers& groupPropBuffers() {
+    static PropBuffers buffers;
+    return buffers;
+}
+
+PropBuffers& specPropBuffers() {
+    static PropBuffers buffers;
+    return buffers;
+}
+
+namespace {
+[[maybe_unused]] const bool g_buffersBuilt = (groupPropBuffers(), specPropBuffers(), true);
+} // namespace
+
+} // namespace tsd_detail
