@@ -1,0 +1,408 @@
+// The builder: construction, the intake of properties and their processing
+// into objects of the design.
+#include "tsd/Tsd_Builder.h"
+
+#include "internal/Tsd_Report.h"
+#include "internal/Tsd_Text.h"
+#include "tsd/Tsd_Parsers.h"
+
+#include <cctype>
+#include <climits>
+#include <cstring>
+#include <string>
+
+using tsd_detail::equalsNoCase;
+using tsd_detail::startsWithNoCase;
+
+namespace {
+
+const char* orEmpty(const char* text) { return text != nullptr ? text : ""; }
+
+short saturatingAdd(short count, long n) {
+    long sum = static_cast<long>(count) + n;
+    if (sum > SHRT_MAX)
+        return SHRT_MAX;
+    if (sum < SHRT_MIN)
+        return SHRT_MIN;
+    return static_cast<short>(sum);
+}
+
+// The ten reference properties and what they make.
+const char* const kGroupRefProps[] = {"TS_TNM", "TS_TPTHRU", "TS_TPSYNC", "TS_TIG", "TS_CLKGRP"};
+const char* const kNetRefProps[] = {"TS_OFFSET", "TS_PERIOD", "TS_MAXDELAY", "TS_MAXSKEW",
+                                    "TS_FEEDBACK"};
+
+template <size_t N>
+bool oneOf(const char* name, const char* const (&names)[N]) {
+    for (const char* candidate : names)
+        if (equalsNoCase(name, candidate))
+            return true;
+    return false;
+}
+
+// The caret line under an echoed "name=value": `spaces` blanks and "^".
+std::string caretLine(int spaces) { return std::string(static_cast<size_t>(spaces), ' ') + "^"; }
+
+// Whether a TS property's value holds the OFFSET keyword, standing after a
+// ':' or white space (or at the start) and before '=', ':' or white space.
+bool hasOffsetKeyword(const char* value) {
+    const size_t length = std::strlen(value);
+    for (size_t i = 0; i + 6 <= length; ++i) {
+        if (!startsWithNoCase(value + i, "OFFSET"))
+            continue;
+        if (i + 6 >= length)
+            return false;
+        char before = i == 0 ? ':' : value[i - 1];
+        char after = value[i + 6];
+        bool beforeOk = before == ':' || std::isspace(static_cast<unsigned char>(before));
+        bool afterOk = after == '=' || after == ':' || std::isspace(static_cast<unsigned char>(after));
+        if (beforeOk && afterOk)
+            return true;
+        i += 5;
+    }
+    return false;
+}
+
+} // namespace
+
+Tsd_Builder::Tsd_Builder(bool createDesign) {
+    if (createDesign) {
+        m_ownedDesign = std::make_unique<Tsd_Design>();
+        m_design = m_ownedDesign.get();
+    }
+    m_specGroupParser = std::make_unique<Tsd_SpecGroupParser>(this);
+    m_netParser = std::make_unique<Tsd_NetParser>(this);
+}
+
+void Tsd_Builder::initBaseBuilder(Tsd_Design* design) {
+    if (m_design != nullptr)
+        TSD_MSG().fatal(2, "Cannot init base builder or re-init derived builder.\n");
+    m_design = design;
+}
+
+Tsd_Design& Tsd_Builder::design() {
+    // A builder constructed without a design must be given one first.
+    if (m_design == nullptr)
+        TSD_MSG().fatal(2, "Tsd_Builder has no design: call initBaseBuilder() first.\n");
+    return *m_design;
+}
+
+void Tsd_Builder::setContext(std::unique_ptr<char16_t[]> context) { setContext(context.get()); }
+
+void Tsd_Builder::setContext(const char16_t* context) {
+    if (context == nullptr)
+        m_context.clear();
+    else
+        m_context = context;
+}
+
+void Tsd_Builder::addError(short n) { m_numError = saturatingAdd(m_numError, n); }
+
+void Tsd_Builder::addWarning(short n) { m_numWarning = saturatingAdd(m_numWarning, n); }
+
+void Tsd_Builder::addErrorCount(int n) { m_numError = saturatingAdd(m_numError, n); }
+
+bool Tsd_Builder::addUserGroupProp(const char* name, const char* value) {
+    if (name == nullptr)
+        return false;
+    if (m_groupProps == nullptr) {
+        m_groupProps = std::make_unique<DARRAY_Tsd_PropPtr>();
+        m_groupProps->reserve(50);
+    }
+    m_groupProps->push_back(std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name),
+                                                                Tsd_String(orEmpty(value))}));
+    return true;
+}
+
+bool Tsd_Builder::addSpecProp(const char* name, const char* value) {
+    if (name == nullptr)
+        return false;
+    bool known = equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
+                 equalsNoCase(name, "DISABLE") || startsWithNoCase(name, "TS") ||
+                 startsWithNoCase(name, "TIMEGRP");
+    if (!known)
+        return false;
+    if (m_specProps == nullptr) {
+        m_specProps = std::make_unique<DARRAY_Tsd_PropPtr>();
+        m_specProps->reserve(50);
+    }
+    m_specProps->push_back(
+        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
+    return true;
+}
+
+bool Tsd_Builder::isRefProp(const char* name) {
+    // A cheap test of the "TS_" prefix first.
+    if (name == nullptr || (name[0] != 'T' && name[0] != 't') ||
+        (name[1] != 'S' && name[1] != 's') || name[2] != '_')
+        return false;
+    return oneOf(name, kGroupRefProps) || oneOf(name, kNetRefProps);
+}
+
+bool Tsd_Builder::addRefProp(Tsd_Ref* ref, const char* name, const char* value) {
+    if (ref == nullptr || name == nullptr)
+        return false;
+    value = orEmpty(value);
+    if (ref->getOwner() != nullptr) {
+        // getUserString's buffer is shared: copy before formatting.
+        std::string owner = ref->getUserString();
+        TSD_MSG().fatal(2,
+                        "Already-owned referenced passed to Tsd_Builder::addRefProp(). The "
+                        "reference is already owned by object %s, and is being added to %s=%s.\n",
+                        owner.c_str(), name, value);
+    }
+    if (oneOf(name, kGroupRefProps)) {
+        Tsd_Group* group = getSimpleGroup(name, value);
+        if (group == nullptr)
+            return false;
+        ref->setOwner(group);
+        return true;
+    }
+    if (oneOf(name, kNetRefProps)) {
+        Tsd_Spec* spec = buildNetSpecFromProp(name, value);
+        if (spec == nullptr)
+            return false;
+        if (Tsd_NetOffset* offset = spec->getNetOffset())
+            design().addOffsetSpec(offset);
+        else if (Tsd_NetTiming* net = spec->getNetTiming())
+            design().addNetSpec(net);
+        else if (Tsd_PortTiming* port = spec->getPortTiming())
+            design().addPortTiming(port);
+        else
+            TSD_MSG().fatal(2, "Non-net spec %s=%s\n", name, value);
+        ref->setOwner(spec);
+        return true;
+    }
+    return false;
+}
+
+Tsd_Group* Tsd_Builder::getSimpleGroup(const char* name, const char* value) {
+    Tsd_Design& d = design();
+    if (equalsNoCase(name, "TS_TIG")) {
+        if (Tsd_TIGGroup* tig = d.findTIGByTSid(value, false))
+            return tig;
+        auto* tig = new Tsd_TIGGroup(value);
+        d.addTIGGroup(tig);
+        return tig;
+    }
+    if (equalsNoCase(name, "TS_CLKGRP")) {
+        if (Tsd_ClkGroup* clock = d.findClockGroupByNetName(value, false)) {
+            if (!clock->getRefList()->isEmpty())
+                MessageManager::debugTrace("Multiple references for %s=%s\n", name, value);
+            return clock;
+        }
+        auto* clock = new Tsd_ClkGroup(value);
+        d.addClockGroup(clock);
+        return clock;
+    }
+    const char* what = nullptr;
+    if (equalsNoCase(name, "TS_TNM"))
+        what = "a TNM group";
+    else if (equalsNoCase(name, "TS_TPTHRU"))
+        what = "a TPTHRU group";
+    else if (equalsNoCase(name, "TS_TPSYNC"))
+        what = "a TPSYNC group";
+    else
+        return nullptr;
+
+    Tsd_Group* found = d.findGroupByUserName(value, false);
+    if (found != nullptr) {
+        Tsd_Group* typed = nullptr;
+        if (equalsNoCase(name, "TS_TNM"))
+            typed = found->getTNMGroup();
+        else if (equalsNoCase(name, "TS_TPTHRU"))
+            typed = found->getThruGroup();
+        else
+            typed = found->getSyncGroup();
+        if (typed != nullptr)
+            return typed;
+        std::string format = std::string("The identifier \"%s\" is used for both ") + what +
+                             " and %z. Group identifiers must be unique.\n";
+        TSD_MSG().error(format.c_str(), value, getObjUserId(found));
+        countError();
+        return nullptr;
+    }
+    Tsd_Group* created = nullptr;
+    if (equalsNoCase(name, "TS_TNM"))
+        created = new Tsd_TNMGroup(value);
+    else if (equalsNoCase(name, "TS_TPTHRU"))
+        created = new Tsd_ThruGroup(value);
+    else
+        created = new Tsd_SyncGroup(value);
+    d.addGroup(created);
+    return created;
+}
+
+Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value) {
+    Tsd_Design& d = design();
+    value = orEmpty(value);
+    bool inDesign = false;
+    Tsd_UserGroup* group = findUnresolvedGroupByName(name);
+    if (group == nullptr) {
+        Tsd_Group* found = d.findGroupByUserName(name, false);
+        if (found != nullptr) {
+            group = found->getUserGroup();
+            if (group == nullptr) {
+                TSD_MSG().error("The identifier \"%s\" is used for both a user group and %z. Group "
+                                "identifiers must be unique.\n",
+                                name, getObjUserId(found));
+                countError();
+                return nullptr;
+            }
+            if (!allowUserGroupOverride(group, value))
+                return nullptr;
+            group->clearDef();
+            inDesign = true;
+        } else {
+            group = new Tsd_UserGroup(name);
+        }
+    }
+    bool defined = initUserGroupFromProp(group, value);
+    if (!inDesign) {
+        // A placeholder becomes the defined group itself, so groups that
+        // already include it keep pointing at the right object.
+        m_unresolvedGroups.removeObj(group);
+        d.addGroup(group);
+    }
+    return defined ? group : nullptr;
+}
+
+bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value) {
+    const char* name = orEmpty(group->getName());
+    std::string text = std::string("TIMEGRP ") + name + "=" + value + " ;";
+    m_specGroupParser->setNewGroup(group);
+    m_specGroupParser->clearError();
+    if (m_specGroupParser->parse(text.c_str())) {
+        const int prefix = 9; // "TIMEGRP " and the column count from 1
+        int offset = m_specGroupParser->getBadOffset();
+        const char* token = m_specGroupParser->getBadToken();
+        if (offset >= prefix && token != nullptr)
+            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP:\n%s=%s\n%s\n",
+                            getContext(), token, name, value,
+                            caretLine(offset - prefix).c_str());
+        else if (token != nullptr)
+            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP.\n", getContext(), token);
+        else
+            TSD_MSG().error("%zUnable to parse TIMEGRP definition.\n", getContext());
+        countError();
+        return false;
+    }
+    return m_specGroupParser->getNewGroup() != nullptr;
+}
+
+Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
+    Tsd_Design& d = design();
+    value = orEmpty(value);
+    Tsd_Spec* spec = buildSpecFromProp(name, value);
+    if (spec == nullptr)
+        return nullptr;
+    if (Tsd_EndpointSpec* endpoint = spec->getEndpointSpec()) {
+        Tsd_EndpointSpec* existing = d.findEndpointSpecByTSid(endpoint->getTSid(), false);
+        if (existing != nullptr) {
+            if (!allowEndpointSpecOverride(existing, value)) {
+                delete spec;
+                return nullptr;
+            }
+            // The displaced spec goes to the trash, where pointers to it stay
+            // valid and the design deletes it in the end.
+            d.moveEndpointSpecToTrash(existing);
+            for (auto it = m_pendingLinks.begin(); it != m_pendingLinks.end(); ++it) {
+                if (*it != nullptr && (*it)->spec == existing) {
+                    m_pendingLinks.erase(it);
+                    break;
+                }
+            }
+        }
+        d.addEndpointSpec(endpoint);
+    } else if (Tsd_Offset* offset = spec->getOffset()) {
+        d.addOffsetSpec(offset);
+    } else if (Tsd_PathControl* control = spec->getPathControl()) {
+        d.addPathControl(control);
+    }
+    return spec;
+}
+
+Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
+    std::string text;
+    int prefix;
+    // Columns of the echoed "name=value" line start `shift` characters
+    // before the parsed text's.
+    int shift = 0;
+    if (equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
+        equalsNoCase(name, "DISABLE")) {
+        text = std::string(name) + "=" + value + " ;";
+        prefix = 1;
+    } else if (startsWithNoCase(name, "TS") && hasOffsetKeyword(value)) {
+        text = std::string(value) + " ;";
+        prefix = 1;
+        shift = static_cast<int>(std::strlen(name)) + 1;
+    } else {
+        text = std::string("TIMESPEC ") + name + "=" + value + " ;";
+        prefix = 10;
+    }
+    m_specGroupParser->clearError();
+    m_specGroupParser->setNewSpec(nullptr);
+    m_specGroupParser->setNewGroup(nullptr);
+    m_pendingLinkTSid.set(nullptr);
+
+    bool failed = m_specGroupParser->parse2(text.c_str());
+    std::unique_ptr<Tsd_Spec> spec(m_specGroupParser->getNewSpec());
+    m_specGroupParser->setNewSpec(nullptr);
+    if (failed) {
+        // A callback may have made an object before the parse failed.
+        spec.reset();
+        int offset = m_specGroupParser->getBadOffset();
+        const char* token = m_specGroupParser->getBadToken();
+        if (offset >= prefix && token != nullptr)
+            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC:\n%s=%s\n%s\n",
+                            getContext(), token, name, value,
+                            caretLine(offset - prefix + shift).c_str());
+        else if (token != nullptr)
+            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC.\n", getContext(), token);
+        else
+            TSD_MSG().error("%zUnable to parse TIMESPEC definition.\n", getContext());
+        countError();
+        return nullptr;
+    }
+    if (spec != nullptr && !m_pendingLinkTSid.isNull()) {
+        Tsd_EndpointSpec* endpoint = spec->getEndpointSpec();
+        if (endpoint == nullptr)
+            TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
+        m_pendingLinks.push_back(
+            std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
+        m_pendingLinkTSid.set(nullptr);
+    }
+    return spec.release();
+}
+
+Tsd_Spec* Tsd_Builder::buildNetSpecFromProp(const char* name, const char* value) {
+    if (!oneOf(name, kNetRefProps))
+        TSD_MSG().fatal(2, "Non net-spec prop %s=%s\n", name, value);
+    std::string text = std::string(name + 3) + "=" + value + " ;";
+    m_netParser->clearError();
+    m_netParser->setNewSpec(nullptr);
+    m_pendingRegGroupName.set(nullptr);
+
+    bool failed = m_netParser->parse2(text.c_str());
+    std::unique_ptr<Tsd_Spec> spec(m_netParser->getNewSpec());
+    m_netParser->setNewSpec(nullptr);
+    if (failed) {
+        spec.reset();
+        if (m_netParser->getBadToken() != nullptr)
+            TSD_MSG().error("%zEncountered bad token \"%s\" in specification.\n", getContext(),
+                            m_netParser->getBadToken());
+        else
+            TSD_MSG().error("%zUnable to parse specification.\n", getContext());
+        countError();
+        return nullptr;
+    }
+    if (spec != nullptr && !m_pendingRegGroupName.isNull()) {
+        Tsd_NetOffset* offset = spec->getNetOffset();
+        if (offset == nullptr)
+            TSD_MSG().fatal(2, "Non-net offset spec has pending reg group!\n");
+        m_pendingRegGroups.push_back(
+            std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingRegGroupName, offset}));
+        m_pendingRegGroupName.set(nullptr);
+    }
+    return spec.release();
+}
