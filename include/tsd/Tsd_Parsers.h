@@ -90,8 +90,8 @@ public:
     bool cb_toffset(const char* padGroup, bool in, double offsetPs, const double* validPs,
                     bool before, const char* clock, const char* highLow,
                     const ConstraintHandle* handle) override;
-    bool cb_roffset(bool in, double offsetPs, const double* validPs, bool before,
-                    const char* clock, const char* regGroup, const char* highLow,
+    bool cb_roffset(bool in, double offsetPs, const double* validPs, bool before, const char* clock,
+                    const char* regGroup, const char* highLow,
                     const ConstraintHandle* handle) override;
     bool cb_troffset(const char* padGroup, bool in, double offsetPs, const double* validPs,
                      bool before, const char* clock, const char* regGroup, const char* highLow,

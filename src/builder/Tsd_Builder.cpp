@@ -16,7 +16,9 @@ using tsd_detail::startsWithNoCase;
 
 namespace {
 
-const char* orEmpty(const char* text) { return text != nullptr ? text : ""; }
+const char* orEmpty(const char* text) {
+    return text != nullptr ? text : "";
+}
 
 short saturatingAdd(short count, long n) {
     long sum = static_cast<long>(count) + n;
@@ -41,7 +43,9 @@ bool oneOf(const char* name, const char* const (&names)[N]) {
 }
 
 // The caret line under an echoed "name=value": `spaces` blanks and "^".
-std::string caretLine(int spaces) { return std::string(static_cast<size_t>(spaces), ' ') + "^"; }
+std::string caretLine(int spaces) {
+    return std::string(static_cast<size_t>(spaces), ' ') + "^";
+}
 
 // Whether a TS property's value holds the OFFSET keyword, standing after a
 // ':' or white space (or at the start) and before '=', ':' or white space.
@@ -55,7 +59,8 @@ bool hasOffsetKeyword(const char* value) {
         char before = i == 0 ? ':' : value[i - 1];
         char after = value[i + 6];
         bool beforeOk = before == ':' || std::isspace(static_cast<unsigned char>(before));
-        bool afterOk = after == '=' || after == ':' || std::isspace(static_cast<unsigned char>(after));
+        bool afterOk =
+            after == '=' || after == ':' || std::isspace(static_cast<unsigned char>(after));
         if (beforeOk && afterOk)
             return true;
         i += 5;
@@ -87,7 +92,9 @@ Tsd_Design& Tsd_Builder::design() {
     return *m_design;
 }
 
-void Tsd_Builder::setContext(std::unique_ptr<char16_t[]> context) { setContext(context.get()); }
+void Tsd_Builder::setContext(std::unique_ptr<char16_t[]> context) {
+    setContext(context.get());
+}
 
 void Tsd_Builder::setContext(const char16_t* context) {
     if (context == nullptr)
@@ -96,11 +103,17 @@ void Tsd_Builder::setContext(const char16_t* context) {
         m_context = context;
 }
 
-void Tsd_Builder::addError(short n) { m_numError = saturatingAdd(m_numError, n); }
+void Tsd_Builder::addError(short n) {
+    m_numError = saturatingAdd(m_numError, n);
+}
 
-void Tsd_Builder::addWarning(short n) { m_numWarning = saturatingAdd(m_numWarning, n); }
+void Tsd_Builder::addWarning(short n) {
+    m_numWarning = saturatingAdd(m_numWarning, n);
+}
 
-void Tsd_Builder::addErrorCount(int n) { m_numError = saturatingAdd(m_numError, n); }
+void Tsd_Builder::addErrorCount(int n) {
+    m_numError = saturatingAdd(m_numError, n);
+}
 
 bool Tsd_Builder::addUserGroupProp(const char* name, const char* value) {
     if (name == nullptr)
@@ -109,8 +122,8 @@ bool Tsd_Builder::addUserGroupProp(const char* name, const char* value) {
         m_groupProps = std::make_unique<DARRAY_Tsd_PropPtr>();
         m_groupProps->reserve(50);
     }
-    m_groupProps->push_back(std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name),
-                                                                Tsd_String(orEmpty(value))}));
+    m_groupProps->push_back(
+        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
     return true;
 }
 
@@ -277,9 +290,8 @@ bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value)
         int offset = m_specGroupParser->getBadOffset();
         const char* token = m_specGroupParser->getBadToken();
         if (offset >= prefix && token != nullptr)
-            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP:\n%s=%s\n%s\n",
-                            getContext(), token, name, value,
-                            caretLine(offset - prefix).c_str());
+            TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP:\n%s=%s\n%s\n", getContext(),
+                            token, name, value, caretLine(offset - prefix).c_str());
         else if (token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP.\n", getContext(), token);
         else
@@ -368,8 +380,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         Tsd_EndpointSpec* endpoint = spec->getEndpointSpec();
         if (endpoint == nullptr)
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
-        m_pendingLinks.push_back(
-            std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
+        m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
         m_pendingLinkTSid.set(nullptr);
     }
     return spec.release();

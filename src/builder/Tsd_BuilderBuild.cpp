@@ -87,7 +87,8 @@ void Tsd_Builder::validateUserGroups() {
 
 void Tsd_Builder::resolvePendingOffsets() {
     Tsd_Design& d = design();
-    const bool referenceMode = d.getRefType() != nullptr && std::strcmp(d.getRefType(), "MM_TSREF") == 0;
+    const bool referenceMode =
+        d.getRefType() != nullptr && std::strcmp(d.getRefType(), "MM_TSREF") == 0;
     for (std::unique_ptr<Tsd_Pend>& pend : m_pendingRegGroups) {
         if (pend == nullptr)
             continue;

@@ -59,9 +59,10 @@ Tsd_TermGroup* Tsd_Builder::getTermGroupForSpec(const char* name) {
     }
     if (Tsd_TermGroup* term = found->getTermGroup())
         return term;
-    TSD_MSG().error("%zGroup \"%s\" is %z, which is not the correct type: a TNM, TPSYNC, user group "
-                    "or predefined group name (such as FFS or RAMS) is required here.\n",
-                    getContext(), name, getObjUserId(found));
+    TSD_MSG().error(
+        "%zGroup \"%s\" is %z, which is not the correct type: a TNM, TPSYNC, user group "
+        "or predefined group name (such as FFS or RAMS) is required here.\n",
+        getContext(), name, getObjUserId(found));
     countError();
     return nullptr;
 }
@@ -129,10 +130,9 @@ Tsd_TermGroup* Tsd_Builder::getTermGroupForNetOffset(const char* name) {
 bool Tsd_Builder::allowUserGroupOverride(Tsd_UserGroup* existing, const char* newValue) {
     const char* name = existing->getName();
     std::string original = existing->getUserString();
-    TSD_MSG().error(
-        "Second group definition found for group \"%s\":\noriginal definition: %s\nnew "
-        "definition: %s=%s\n",
-        name, original.c_str(), name, newValue);
+    TSD_MSG().error("Second group definition found for group \"%s\":\noriginal definition: %s\nnew "
+                    "definition: %s=%s\n",
+                    name, original.c_str(), name, newValue);
     countError();
     return false;
 }

@@ -6,7 +6,9 @@
 
 namespace tsd_detail {
 
-inline char lowerAscii(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c; }
+inline char lowerAscii(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c;
+}
 
 // Equal without regard to ASCII case; null equals nothing.
 inline bool equalsNoCase(const char* a, const char* b) {

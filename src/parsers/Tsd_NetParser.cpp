@@ -9,7 +9,9 @@
 
 namespace {
 
-Tsd_TimeValue picoseconds(double ps) { return Tsd_TimeValue(ps, Tsd_TimeValue::UNITS_PS); }
+Tsd_TimeValue picoseconds(double ps) {
+    return Tsd_TimeValue(ps, Tsd_TimeValue::UNITS_PS);
+}
 
 } // namespace
 
@@ -24,7 +26,9 @@ bool Tsd_NetParser::parse2(const char* text) {
     return parse(text);
 }
 
-void Tsd_NetParser::store(std::unique_ptr<Tsd_Spec> spec) { m_newSpec = spec.release(); }
+void Tsd_NetParser::store(std::unique_ptr<Tsd_Spec> spec) {
+    m_newSpec = spec.release();
+}
 
 bool Tsd_NetParser::cb_error(int /*code*/, const char* token) {
     m_badToken.set(token);
@@ -63,8 +67,8 @@ bool Tsd_NetParser::cb_maxskew(double skewPs) {
 bool Tsd_NetParser::cb_offset(bool in, double offsetPs, const double* validPs, bool before,
                               const char* clock, const char* regGroup, const char* highLow) {
     auto offset = std::make_unique<Tsd_NetOffset>();
-    bool ok = Tsd_SpecGroupParser::addBaseOffset(offset.get(), in, offsetPs, validPs, before,
-                                                 clock, highLow, m_builder, m_bonusParser.get());
+    bool ok = Tsd_SpecGroupParser::addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock,
+                                                 highLow, m_builder, m_bonusParser.get());
     // A register group not defined yet stays pending; the builder resolves it.
     if (regGroup != nullptr)
         offset->setRegGroup(m_builder->getTermGroupForNetOffset(regGroup));

@@ -15,7 +15,9 @@ namespace {
 const bool g_reducerDisabled = std::getenv("QOR_TSD_NO_SPECIAL_PARSER") != nullptr;
 const bool g_reducerDebug = std::getenv("QOR_TSD_DEBUG_SPECIAL_PARSER") != nullptr;
 
-bool isSeparator(char c) { return c == ':' || c == '=' || c == ' '; }
+bool isSeparator(char c) {
+    return c == ':' || c == '=' || c == ' ';
+}
 
 // Splits at ':', '=' and blanks; a quoted part is one token, without quotes.
 std::vector<std::string> tokenize(const std::string& text) {
@@ -54,9 +56,13 @@ bool needsQuotes(const std::string& token) {
 
 } // namespace
 
-bool Tsd_OffsetBonusParser::isDisabled() { return g_reducerDisabled; }
+bool Tsd_OffsetBonusParser::isDisabled() {
+    return g_reducerDisabled;
+}
 
-bool Tsd_OffsetBonusParser::isDebugEnabled() { return g_reducerDebug; }
+bool Tsd_OffsetBonusParser::isDebugEnabled() {
+    return g_reducerDebug;
+}
 
 void Tsd_OffsetBonusParser::reset() {
     m_reduced.clear();

@@ -10,7 +10,9 @@
 
 namespace {
 
-Tsd_TimeValue picoseconds(double ps) { return Tsd_TimeValue(ps, Tsd_TimeValue::UNITS_PS); }
+Tsd_TimeValue picoseconds(double ps) {
+    return Tsd_TimeValue(ps, Tsd_TimeValue::UNITS_PS);
+}
 
 } // namespace
 
@@ -30,7 +32,9 @@ void Tsd_SpecGroupParser::clearError() {
     m_badOffset = -1;
 }
 
-void Tsd_SpecGroupParser::store(std::unique_ptr<Tsd_Spec> spec) { m_newSpec = spec.release(); }
+void Tsd_SpecGroupParser::store(std::unique_ptr<Tsd_Spec> spec) {
+    m_newSpec = spec.release();
+}
 
 Tsd_PredefGroup* Tsd_SpecGroupParser::findMember(Tsd_UserGroup* group, const char* name,
                                                  Tsd_Builder* builder) {
@@ -59,13 +63,12 @@ Tsd_UserGroup::Edge Tsd_SpecGroupParser::convertPrefEdge(ParserEdge edge) {
     }
 }
 
-bool Tsd_SpecGroupParser::addInclude(Tsd_UserGroup* group,
-                                     const std::vector<std::pair<const char*, ParserEdge>>& includes,
-                                     Tsd_Builder* builder) {
+bool Tsd_SpecGroupParser::addInclude(
+    Tsd_UserGroup* group, const std::vector<std::pair<const char*, ParserEdge>>& includes,
+    Tsd_Builder* builder) {
     bool ok = true;
     for (const auto& include : includes) {
-        Tsd_PredefGroup* member =
-            findMember(group, include.first, builder);
+        Tsd_PredefGroup* member = findMember(group, include.first, builder);
         if (member != nullptr)
             group->addGroup(member, convertPrefEdge(include.second), false);
         else
@@ -111,9 +114,8 @@ bool Tsd_SpecGroupParser::addFromToThru(Tsd_DelayPath* path, bool hasFrom, bool 
 }
 
 bool Tsd_SpecGroupParser::addBaseOffset(Tsd_Offset* offset, bool in, double value,
-                                        const double* dataValid, bool before,
-                                        const char* clockName, const char* highLow,
-                                        Tsd_Builder* builder,
+                                        const double* dataValid, bool before, const char* clockName,
+                                        const char* highLow, Tsd_Builder* builder,
                                         const Tsd_OffsetBonusParser* bonus) {
     bool ok = true;
     offset->setIn(in);
@@ -183,12 +185,12 @@ void Tsd_SpecGroupParser::setDelayOrLink(Tsd_EndpointSpec* spec, const char* lin
     spec->setDelayValue(value);
 }
 
-bool Tsd_SpecGroupParser::cb_tspec_period(const char* tsid, const char* group,
-                                          const char* linkTsid, bool multiply,
-                                          double valueOrFactor, bool isTime, bool phasePositive,
-                                          double phasePs, bool dutyLow, double dutyTimePs,
-                                          double dutyPercent, const double* inputJitterPs,
-                                          int priority, const ConstraintHandle* /*handle*/) {
+bool Tsd_SpecGroupParser::cb_tspec_period(const char* tsid, const char* group, const char* linkTsid,
+                                          bool multiply, double valueOrFactor, bool isTime,
+                                          bool phasePositive, double phasePs, bool dutyLow,
+                                          double dutyTimePs, double dutyPercent,
+                                          const double* inputJitterPs, int priority,
+                                          const ConstraintHandle* /*handle*/) {
     auto period = std::make_unique<Tsd_Period>(tsid);
     Tsd_TermGroup* periodGroup = m_builder->getTermGroupForSpec(group);
     period->setPeriodGroup(periodGroup);
@@ -245,10 +247,9 @@ bool Tsd_SpecGroupParser::cb_tspec_drop_spec(const char* tsid, const ConstraintH
                     tsid);
 }
 
-bool Tsd_SpecGroupParser::cb_timegrp(const char* /*name*/,
-                                     const std::vector<std::pair<const char*, ParserEdge>>& includes,
-                                     const std::vector<const char*>& excludes,
-                                     const ConstraintHandle* /*handle*/) {
+bool Tsd_SpecGroupParser::cb_timegrp(
+    const char* /*name*/, const std::vector<std::pair<const char*, ParserEdge>>& includes,
+    const std::vector<const char*>& excludes, const ConstraintHandle* /*handle*/) {
     // Only a TIMEGRP definition that the builder prepared may fill a group;
     // one met in any other text has nothing to define and fails the parse.
     if (m_newGroup == nullptr)
@@ -315,4 +316,3 @@ bool Tsd_SpecGroupParser::cb_troffset(const char* padGroup, bool in, double offs
         store(std::move(offset));
     return true;
 }
-
