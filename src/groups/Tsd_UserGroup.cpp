@@ -199,32 +199,30 @@ int Tsd_UserGroup::checkInExcludes(bool report) {
     // definitions with many shared members linear, and changes no count.
     int count = 0;
     std::unordered_set<const Tsd_UserGroup*> clean;
+    std::unordered_set<const Tsd_UserGroup*> onRoute;
     std::vector<Frame> route;
     route.emplace_back(this, count);
+    onRoute.insert(this);
     while (!route.empty()) {
         Tsd_PredefGroup* member = route.back().nextMember();
         if (member == nullptr) {
             if (count == route.back().countOnEntry)
                 clean.insert(route.back().group);
+            onRoute.erase(route.back().group);
             route.pop_back();
             continue;
         }
         Tsd_UserGroup* user = member->getUserGroup();
         if (user == nullptr || clean.count(user) != 0)
             continue;
-        bool onRoute = false;
-        for (const Frame& frame : route)
-            if (frame.group == user) {
-                onRoute = true;
-                break;
-            }
-        if (onRoute) {
+        if (onRoute.count(user) != 0) {
             ++count;
             if (report)
                 reportCircle(route);
             continue;
         }
         route.emplace_back(user, count);
+        onRoute.insert(user);
     }
     return count;
 }
