@@ -120,7 +120,6 @@ private:
 
     // Moves obj from the active list to the trash; false if not active.
     static bool moveToTrash(ListPair& pair, Tsd_BaseObj* obj);
-    static void deleteAllObjects(ListPair& pair);
     void dumpList(DumpStream& stream, short indent, const ListPair& pair) const;
 
     int trimRefObjs(ListPair& pair);

@@ -1,0 +1,220 @@
+// The design container: typed lists with trash lists, finds and the dump.
+#include "tsd/Tsd_Design.h"
+
+#include "internal/Tsd_Report.h"
+
+#include <cstring>
+#include <unordered_set>
+
+namespace {
+
+const char* kGlobalTIGName = "global";
+
+bool sameName(const char* a, const char* b) {
+    return a != nullptr && b != nullptr && std::strcmp(a, b) == 0;
+}
+
+} // namespace
+
+void Tsd_Design::reportObjTrashed(Tsd_BaseObj* /*obj*/, TrimReason /*reason*/) {}
+
+Tsd_Design::Tsd_Design(const char* refType) : m_refType(refType) {}
+
+Tsd_Design::~Tsd_Design() {
+    // Every object dies exactly once, in list order, pair by pair. An object
+    // that a caller added twice (the add operations do not check) is
+    // deleted at its first occurrence only.
+    std::unordered_set<const Tsd_BaseObj*> deleted;
+    for (ListPair* pair : {&m_groups, &m_clockGroups, &m_tigGroups, &m_endpointSpecs,
+                           &m_offsetSpecs, &m_netSpecs, &m_pathControls, &m_portSpecs}) {
+        for (Tsd_BaseObjList* list : {&pair->active, &pair->trash}) {
+            for (int i = 0; i < list->getCount(); ++i) {
+                Tsd_BaseObj* obj = list->getAt(i);
+                if (obj != nullptr && deleted.insert(obj).second)
+                    delete obj;
+            }
+        }
+    }
+}
+
+bool Tsd_Design::moveToTrash(ListPair& pair, Tsd_BaseObj* obj) {
+    // A null argument would otherwise "remove" the first hole of the list.
+    if (obj == nullptr || !pair.active.removeObj(obj))
+        return false;
+    pair.trash.addObj(obj);
+    return true;
+}
+
+void Tsd_Design::addGroup(Tsd_Group* group) {
+    m_groups.active.addObj(group);
+}
+bool Tsd_Design::moveGroupToTrash(Tsd_Group* group) {
+    return moveToTrash(m_groups, group);
+}
+bool Tsd_Design::isGroupTrashed(const Tsd_Group* group) const {
+    return m_groups.trash.contains(group);
+}
+
+void Tsd_Design::addClockGroup(Tsd_ClkGroup* group) {
+    m_clockGroups.active.addObj(group);
+}
+bool Tsd_Design::moveClockGroupToTrash(Tsd_ClkGroup* group) {
+    return moveToTrash(m_clockGroups, group);
+}
+bool Tsd_Design::isClockGroupTrashed(const Tsd_ClkGroup* group) const {
+    return m_clockGroups.trash.contains(group);
+}
+
+void Tsd_Design::addTIGGroup(Tsd_TIGGroup* group) {
+    m_tigGroups.active.addObj(group);
+}
+bool Tsd_Design::moveTIGGroupToTrash(Tsd_TIGGroup* group) {
+    return moveToTrash(m_tigGroups, group);
+}
+bool Tsd_Design::isTIGGroupTrashed(const Tsd_TIGGroup* group) const {
+    return m_tigGroups.trash.contains(group);
+}
+
+void Tsd_Design::addEndpointSpec(Tsd_EndpointSpec* spec) {
+    m_endpointSpecs.active.addObj(spec);
+}
+bool Tsd_Design::moveEndpointSpecToTrash(Tsd_EndpointSpec* spec) {
+    return moveToTrash(m_endpointSpecs, spec);
+}
+bool Tsd_Design::isEndpointSpecTrashed(const Tsd_EndpointSpec* spec) const {
+    return m_endpointSpecs.trash.contains(spec);
+}
+
+void Tsd_Design::addOffsetSpec(Tsd_Offset* spec) {
+    m_offsetSpecs.active.addObj(spec);
+}
+bool Tsd_Design::moveOffsetSpecToTrash(Tsd_Offset* spec) {
+    return moveToTrash(m_offsetSpecs, spec);
+}
+bool Tsd_Design::isOffsetSpecTrashed(const Tsd_Offset* spec) const {
+    return m_offsetSpecs.trash.contains(spec);
+}
+
+void Tsd_Design::addNetSpec(Tsd_NetTiming* spec) {
+    m_netSpecs.active.addObj(spec);
+}
+bool Tsd_Design::moveNetSpecToTrash(Tsd_NetTiming* spec) {
+    return moveToTrash(m_netSpecs, spec);
+}
+bool Tsd_Design::isNetSpecTrashed(const Tsd_NetTiming* spec) const {
+    return m_netSpecs.trash.contains(spec);
+}
+
+void Tsd_Design::addPathControl(Tsd_PathControl* spec) {
+    m_pathControls.active.addObj(spec);
+}
+bool Tsd_Design::movePathControlToTrash(Tsd_PathControl* spec) {
+    return moveToTrash(m_pathControls, spec);
+}
+bool Tsd_Design::isPathControlTrashed(const Tsd_PathControl* spec) const {
+    return m_pathControls.trash.contains(spec);
+}
+
+void Tsd_Design::addPortTiming(Tsd_PortTiming* spec) {
+    m_portSpecs.active.addObj(spec);
+}
+bool Tsd_Design::movePortTimingToTrash(Tsd_PortTiming* spec) {
+    return moveToTrash(m_portSpecs, spec);
+}
+bool Tsd_Design::isPortTimingTrashed(const Tsd_PortTiming* spec) const {
+    return m_portSpecs.trash.contains(spec);
+}
+
+namespace {
+
+// The first element of the active list (then, when asked, of the trash) that
+// casts to T and whose key equals `key`; an element of another class is a
+// broken invariant.
+template <class T, class Cast, class Key>
+T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, bool includeTrash,
+          const char* key, Cast cast, Key keyOf, const char* wrongClassMessage) {
+    for (const Tsd_BaseObjList* list : {&active, &trash}) {
+        if (list == &trash && !includeTrash)
+            break;
+        Tsd_BaseObjListIter iter(list);
+        while (Tsd_BaseObj* obj = iter.next()) {
+            T* typed = cast(obj);
+            if (typed == nullptr)
+                TSD_MSG().fatal(2, "%s", wrongClassMessage);
+            if (sameName(keyOf(typed), key))
+                return typed;
+        }
+    }
+    return nullptr;
+}
+
+} // namespace
+
+Tsd_Group* Tsd_Design::findGroupByUserName(const char* name, bool includeTrash) const {
+    return findIn<Tsd_Group>(
+        m_groups.active, m_groups.trash, includeTrash, name,
+        [](Tsd_BaseObj* o) { return o->getGroup(); }, [](Tsd_Group* g) { return g->getName(); },
+        "Non-group object.\n");
+}
+
+Tsd_ClkGroup* Tsd_Design::findClockGroupByNetName(const char* netName, bool includeTrash) const {
+    return findIn<Tsd_ClkGroup>(
+        m_clockGroups.active, m_clockGroups.trash, includeTrash, netName,
+        [](Tsd_BaseObj* o) { return o->getClkGroup(); },
+        [](Tsd_ClkGroup* g) { return g->getName(); }, "Non-clock group object.\n");
+}
+
+Tsd_TIGGroup* Tsd_Design::findTIGByTSid(const char* tsid, bool includeTrash) const {
+    if (tsid == nullptr || *tsid == 0)
+        tsid = kGlobalTIGName;
+    return findIn<Tsd_TIGGroup>(
+        m_tigGroups.active, m_tigGroups.trash, includeTrash, tsid,
+        [](Tsd_BaseObj* o) { return o->getTIGGroup(); },
+        [](Tsd_TIGGroup* g) { return g->getName(); }, "Non-TIG object.\n");
+}
+
+Tsd_EndpointSpec* Tsd_Design::findEndpointSpecByTSid(const char* tsid, bool includeTrash) const {
+    return findIn<Tsd_EndpointSpec>(
+        m_endpointSpecs.active, m_endpointSpecs.trash, includeTrash, tsid,
+        [](Tsd_BaseObj* o) { return o->getEndpointSpec(); },
+        [](Tsd_EndpointSpec* s) { return s->getTSid(); }, "Non-endpoint spec object.\n");
+}
+
+void Tsd_Design::dumpList(DumpStream& stream, short indent, const ListPair& pair) const {
+    stream << tsd_detail::indent(indent) << "active objects:" << DumpStream::endl;
+    Tsd_BaseObjListIter active(&pair.active);
+    while (Tsd_BaseObj* obj = active.next())
+        obj->dump(stream, static_cast<short>(indent + 1));
+    stream << tsd_detail::indent(indent) << "trashed objects:" << DumpStream::endl;
+    Tsd_BaseObjListIter trashed(&pair.trash);
+    while (Tsd_BaseObj* obj = trashed.next())
+        obj->dump(stream, static_cast<short>(indent + 1));
+}
+
+void Tsd_Design::dump(DumpStream& stream, short indent) const {
+    const char* pad = tsd_detail::indent(indent);
+    stream << pad << "Tsd_Design" << DumpStream::endl;
+    if (getRefType() != nullptr)
+        stream << pad << "   design refType \"" << getRefType() << "\"" << DumpStream::endl;
+    const struct {
+        const char* title;
+        const ListPair* pair;
+    } blocks[] = {
+        {"   m_groups:", &m_groups},
+        {"   m_clockGroups:", &m_clockGroups},
+        {"   m_tigGroups:", &m_tigGroups},
+        {"   m_endpointSpecs:", &m_endpointSpecs},
+        {"   m_offsetSpecs:", &m_offsetSpecs},
+        {"   m_netSpecs:", &m_netSpecs},
+        {"   m_pathControls:", &m_pathControls},
+        {"   m_portSpecs:", &m_portSpecs},
+    };
+    for (const auto& block : blocks) {
+        stream << pad << block.title << DumpStream::endl;
+        dumpList(stream, static_cast<short>(indent + 2), *block.pair);
+    }
+    stream << pad
+           << (m_globalTIG != nullptr ? "   global TIG is installed"
+                                      : "   global TIG is not installed")
+           << DumpStream::endl;
+}
