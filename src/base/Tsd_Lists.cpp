@@ -8,6 +8,9 @@ namespace {
 // Clears the first slot of `array` that holds p.
 template <class T>
 bool clearFirst(Tsd_DArray<T>& array, const T* p) {
+    // Null is never held: it must not "remove" a hole.
+    if (p == nullptr)
+        return false;
     for (int i = 0; i < array.getCount(); ++i) {
         if (array.getAt(i) == p) {
             array.setAt(i, nullptr);

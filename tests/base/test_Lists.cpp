@@ -44,7 +44,8 @@ TEST(RefList, AddRemoveAndHoles) {
     EXPECT_TRUE(list.removeRef(&a));
     EXPECT_TRUE(list.removeRef(&b));
     EXPECT_FALSE(list.removeRef(&b));
-    EXPECT_TRUE(list.isEmpty()); // every slot cleared, count still 3
+    EXPECT_TRUE(list.isEmpty());           // every slot cleared, count still 3
+    EXPECT_FALSE(list.removeRef(nullptr)); // a hole is not a reference
     EXPECT_EQ(list.getCount(), 3);
     list.emptyList();
     EXPECT_EQ(list.getCount(), 0);
@@ -104,6 +105,7 @@ TEST(BaseObjList, WalkSkipsHolesAndSurvivesRemovalDuringTheWalk) {
     }
     EXPECT_EQ(seen, (std::vector<Tsd_BaseObj*>{&o[0], &o[1], &o[2], &o[4]}));
     EXPECT_FALSE(list.contains(&o[3]));
+    EXPECT_FALSE(list.removeObj(nullptr)); // holes are not objects
 
     // A second walk sees what is left, in insertion order.
     seen.clear();

@@ -117,4 +117,24 @@ std::string dumpText(const Obj& obj, short indent = 0) {
     return out.str();
 }
 
+// An object's property as two copied strings; "<no property>" as the name
+// when getProp returns false.
+struct Prop {
+    std::string name;
+    std::string value;
+    bool operator==(const Prop& other) const { return name == other.name && value == other.value; }
+};
+
+inline Prop propOf(const Tsd_BaseObj& obj) {
+    const char* name = nullptr;
+    const char* value = nullptr;
+    if (!obj.getProp(name, value))
+        return {"<no property>", ""};
+    return {name != nullptr ? name : "<null>", value != nullptr ? value : "<null>"};
+}
+
+inline std::ostream& operator<<(std::ostream& out, const Prop& prop) {
+    return out << prop.name << " = " << prop.value;
+}
+
 } // namespace tsd_test

@@ -1,0 +1,243 @@
+// TIMEGRP user groups: member entries, the canonical TIMEGRP value and the
+// search for circular definitions.
+#include "tsd/Tsd_Groups.h"
+
+#include "internal/Tsd_ObjText.h"
+#include "internal/Tsd_PropBuffers.h"
+#include "internal/Tsd_Report.h"
+#include "tsd/Tsd_StaticBuf.h"
+
+#include <string>
+#include <unordered_set>
+#include <vector>
+
+using tsd_detail::dumpLine;
+using tsd_detail::orEmpty;
+
+namespace {
+
+const char* edgePrefix(Tsd_UserGroup::Edge edge) {
+    switch (edge) {
+    case Tsd_UserGroup::EDGE_RISING:
+        return "RISING:";
+    case Tsd_UserGroup::EDGE_FALLING:
+        return "FALLING:";
+    case Tsd_UserGroup::EDGE_TRANSHI:
+        return "TRANSHI:";
+    case Tsd_UserGroup::EDGE_TRANSLO:
+        return "TRANSLO:";
+    default:
+        return "";
+    }
+}
+
+const char* edgeDumpText(Tsd_UserGroup::Edge edge) {
+    switch (edge) {
+    case Tsd_UserGroup::EDGE_RISING:
+        return "Rising Edge";
+    case Tsd_UserGroup::EDGE_FALLING:
+        return "Falling Edge";
+    case Tsd_UserGroup::EDGE_TRANSHI:
+        return "Transparent High";
+    case Tsd_UserGroup::EDGE_TRANSLO:
+        return "Transparent Low";
+    case Tsd_UserGroup::EDGE_ANY:
+        return "Any edge";
+    default:
+        return "";
+    }
+}
+
+// The entries of a member list are all Tsd_GroupRef: only this module
+// fills the lists.
+Tsd_GroupRef* entryAt(const Tsd_BaseObjList& list, int i) {
+    return static_cast<Tsd_GroupRef*>(list.getAt(i));
+}
+
+void deleteEntries(Tsd_BaseObjList& list) {
+    for (int i = 0; i < list.getCount(); ++i)
+        delete entryAt(list, i);
+    list.emptyList();
+}
+
+void copyEntries(const Tsd_UserGroup& from, bool excludes, Tsd_UserGroup& to) {
+    Tsd_UserGroupIter iter(&from, excludes);
+    Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
+    while (Tsd_PredefGroup* member = iter.next(edge))
+        to.addGroup(member, edge, excludes);
+}
+
+} // namespace
+
+Tsd_UserGroup::Tsd_UserGroup(const char* name) : Tsd_PredefGroup(name) {}
+
+Tsd_UserGroup::Tsd_UserGroup(const Tsd_UserGroup& other) : Tsd_PredefGroup(other) {
+    copyEntries(other, false, *this);
+    copyEntries(other, true, *this);
+}
+
+Tsd_UserGroup::~Tsd_UserGroup() {
+    deleteEntries(m_includes);
+    deleteEntries(m_excludes);
+}
+
+void Tsd_UserGroup::addGroup(Tsd_PredefGroup* group, Edge edge, bool exclude) {
+    // An entry without a member would end every walk of the list early and
+    // hide the members added after it.
+    if (group == nullptr)
+        return;
+    (exclude ? m_excludes : m_includes).addObj(new Tsd_GroupRef(group, edge));
+}
+
+bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
+    if (group == nullptr)
+        return false;
+    Tsd_BaseObjList& list = exclude ? m_excludes : m_includes;
+    bool removed = false;
+    for (int i = 0; i < list.getCount(); ++i) {
+        Tsd_GroupRef* entry = entryAt(list, i);
+        if (entry != nullptr && entry->getMember() == group) {
+            list.setAt(i, nullptr);
+            delete entry;
+            removed = true;
+        }
+    }
+    return removed;
+}
+
+void Tsd_UserGroup::clearDef() {
+    deleteEntries(m_includes);
+    deleteEntries(m_excludes);
+}
+
+bool Tsd_UserGroup::getProp(const char*& name, const char*& value) const {
+    std::string text;
+    Edge edge = EDGE_ANY;
+    Tsd_UserGroupIter includes(this, false);
+    bool first = true;
+    while (Tsd_PredefGroup* member = includes.next(edge)) {
+        if (!first)
+            text += ':';
+        first = false;
+        text += edgePrefix(edge);
+        text += Tsd_Util::getAnnoName(member->getName());
+    }
+    Tsd_UserGroupIter excludes(this, true);
+    first = true;
+    while (Tsd_PredefGroup* member = excludes.next(edge)) {
+        text += first ? ":EXCEPT:" : ":";
+        first = false;
+        text += edgePrefix(edge);
+        text += Tsd_Util::getAnnoName(member->getName());
+    }
+    tsd_detail::PropBuffers& buffers = tsd_detail::groupPropBuffers();
+    buffers.name.copy(getName());
+    buffers.value.copy(text.c_str());
+    return buffers.handOut(name, value);
+}
+
+void Tsd_UserGroup::dump(DumpStream& stream, short indent) const {
+    dumpLine(stream, indent, "Tsd_UserGroup");
+    dumpLine(stream, indent + 1, tsd_detail::nameLine(getName()));
+    for (bool excludes : {false, true}) {
+        dumpLine(stream, indent, excludes ? "   excluded groups:" : "   included groups:");
+        Tsd_UserGroupIter iter(this, excludes);
+        Edge edge = EDGE_ANY;
+        while (Tsd_PredefGroup* member = iter.next(edge))
+            dumpLine(stream, indent,
+                     std::string("      ") + orEmpty(member->getName()) + " - " +
+                         edgeDumpText(edge));
+    }
+}
+
+namespace {
+
+// One user group on the current route of the circular-definition walk, and
+// how far its members have been walked.
+struct Frame {
+    Tsd_UserGroup* group;
+    Tsd_UserGroupIter includes;
+    Tsd_UserGroupIter excludes;
+    bool inExcludes;
+    int countOnEntry;
+
+    explicit Frame(Tsd_UserGroup* g, int count)
+        : group(g), includes(g, false), excludes(g, true), inExcludes(false), countOnEntry(count) {}
+
+    // The next member to visit: included members first, then excluded ones.
+    Tsd_PredefGroup* nextMember() {
+        Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
+        if (!inExcludes) {
+            if (Tsd_PredefGroup* member = includes.next(edge))
+                return member;
+            inExcludes = true;
+        }
+        return excludes.next(edge);
+    }
+};
+
+void reportCircle(const std::vector<Frame>& route) {
+    Message msg = TSD_MSG();
+    msg.error("Circular group definition encountered from user group \"%s\", as follows:\n",
+              orEmpty(route.front().group->getName()));
+    for (const Frame& frame : route) {
+        const char* name = nullptr;
+        const char* value = nullptr;
+        frame.group->getProp(name, value);
+        msg.status("   %s=%s\n", name, value);
+    }
+}
+
+} // namespace
+
+int Tsd_UserGroup::checkInExcludes(bool report) {
+    // A depth-first walk over every route from this group, with an explicit
+    // stack so that a long chain of definitions cannot exhaust the call
+    // stack. Each route that comes back to a group already on it is one
+    // circle. A group whose walk found no circle reaches no circle at all,
+    // whatever the route to it, so later routes skip it: that keeps sound
+    // definitions with many shared members linear, and changes no count.
+    int count = 0;
+    std::unordered_set<const Tsd_UserGroup*> clean;
+    std::unordered_set<const Tsd_UserGroup*> onRoute;
+    std::vector<Frame> route;
+    route.emplace_back(this, count);
+    onRoute.insert(this);
+    while (!route.empty()) {
+        Tsd_PredefGroup* member = route.back().nextMember();
+        if (member == nullptr) {
+            if (count == route.back().countOnEntry)
+                clean.insert(route.back().group);
+            onRoute.erase(route.back().group);
+            route.pop_back();
+            continue;
+        }
+        Tsd_UserGroup* user = member->getUserGroup();
+        if (user == nullptr || clean.count(user) != 0)
+            continue;
+        if (onRoute.count(user) != 0) {
+            ++count;
+            if (report)
+                reportCircle(route);
+            continue;
+        }
+        route.emplace_back(user, count);
+        onRoute.insert(user);
+    }
+    return count;
+}
+
+// --- Tsd_UserGroupIter -----------------------------------------------------
+
+Tsd_UserGroupIter::Tsd_UserGroupIter(const Tsd_UserGroup* group, bool excludes)
+    : m_iter(group == nullptr ? nullptr
+             : excludes       ? &group->m_excludes
+                              : &group->m_includes) {}
+
+Tsd_PredefGroup* Tsd_UserGroupIter::next(Tsd_UserGroup::Edge& edge) {
+    auto* entry = static_cast<Tsd_GroupRef*>(m_iter.next());
+    if (entry == nullptr || entry->getMember() == nullptr)
+        return nullptr;
+    edge = entry->getEdge();
+    return entry->getMember();
+}

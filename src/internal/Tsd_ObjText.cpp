@@ -1,0 +1,76 @@
+#include "internal/Tsd_ObjText.h"
+
+#include "internal/Tsd_PropBuffers.h"
+#include "internal/Tsd_Report.h"
+
+namespace tsd_detail {
+
+namespace {
+char lower(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+} // namespace
+
+bool equalsNoCase(const char* a, const char* b) {
+    if (a == nullptr || b == nullptr)
+        return a == b;
+    for (; *a != 0 && *b != 0; ++a, ++b)
+        if (lower(*a) != lower(*b))
+            return false;
+    return *a == *b;
+}
+
+bool startsWithNoCase(const char* text, const char* keyword, size_t length) {
+    if (text == nullptr || keyword == nullptr)
+        return false;
+    for (size_t i = 0; i < length; ++i) {
+        if (text[i] == 0 || lower(text[i]) != lower(keyword[i]))
+            return false;
+    }
+    return true;
+}
+
+void dumpLine(DumpStream& stream, int level, const std::string& text) {
+    stream << indent(level) << text.c_str() << DumpStream::endl;
+}
+
+std::string nameLine(const char* name) {
+    return name != nullptr ? std::string("name = ") + name : std::string("unnamed");
+}
+
+std::string dumpTime(const Tsd_TimeValue& value) {
+    return value.getString(" ");
+}
+
+std::string propTime(const Tsd_TimeValue& value) {
+    return value.getString(":");
+}
+
+bool refGroupProp(const char* propName, const char* groupName, const char*& name,
+                  const char*& value) {
+    PropBuffers& buffers = groupPropBuffers();
+    buffers.name.copy(propName);
+    buffers.value.copy(groupName);
+    return buffers.handOut(name, value);
+}
+
+void dumpRefs(DumpStream& stream, short indent, const Tsd_RefList& refs) {
+    dumpLine(stream, indent, "   references:");
+    Tsd_RefListIter iter(&refs);
+    while (Tsd_Ref* ref = iter.next())
+        ref->dump(stream, static_cast<short>(indent + 2));
+}
+
+void dumpRefGroup(DumpStream& stream, short indent, const char* className, const char* groupName,
+                  const Tsd_RefList& refs) {
+    dumpLine(stream, indent, className);
+    dumpLine(stream, indent + 1, nameLine(groupName));
+    dumpRefs(stream, indent, refs);
+}
+
+void dumpScope(DumpStream& stream, short indent, const char* scope) {
+    if (scope != nullptr)
+        dumpLine(stream, indent, std::string("   constraint scope: ") + scope);
+}
+
+} // namespace tsd_detail
