@@ -3,7 +3,7 @@
 #include "tsd/Tsd_Builder.h"
 
 #include "internal/Tsd_Report.h"
-#include "internal/Tsd_Text.h"
+#include "internal/Tsd_ObjText.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cctype>
@@ -12,6 +12,7 @@
 #include <string>
 
 using tsd_detail::equalsNoCase;
+using tsd_detail::orEmpty;
 using tsd_detail::startsWithNoCase;
 
 namespace {

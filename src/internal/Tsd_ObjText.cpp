@@ -1,5 +1,7 @@
 #include "internal/Tsd_ObjText.h"
 
+#include <cstring>
+
 #include "internal/Tsd_PropBuffers.h"
 #include "internal/Tsd_Report.h"
 
@@ -28,6 +30,10 @@ bool startsWithNoCase(const char* text, const char* keyword, size_t length) {
             return false;
     }
     return true;
+}
+
+bool startsWithNoCase(const char* text, const char* prefix) {
+    return prefix != nullptr && startsWithNoCase(text, prefix, std::strlen(prefix));
 }
 
 void dumpLine(DumpStream& stream, int level, const std::string& text) {

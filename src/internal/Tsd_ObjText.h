@@ -22,6 +22,8 @@ inline const char* orEmpty(const char* text) {
 bool equalsNoCase(const char* a, const char* b);
 // True when `text` begins with the `length` characters of `keyword`.
 bool startsWithNoCase(const char* text, const char* keyword, size_t length);
+// True when `text` begins with the whole of `prefix`.
+bool startsWithNoCase(const char* text, const char* prefix);
 
 // One dump line: the indentation of `level`, the text, the end of line.
 void dumpLine(DumpStream& stream, int level, const std::string& text);

@@ -2,7 +2,7 @@
 #include "tsd/Tsd_Parsers.h"
 
 #include "internal/Tsd_Report.h"
-#include "internal/Tsd_Text.h"
+#include "internal/Tsd_ObjText.h"
 
 #include <cstdlib>
 #include <cstring>

@@ -3,7 +3,7 @@
 #include "tsd/Tsd_Parsers.h"
 
 #include "internal/Tsd_Report.h"
-#include "internal/Tsd_Text.h"
+#include "internal/Tsd_ObjText.h"
 #include "tsd/Tsd_Builder.h"
 
 #include <cstring>
