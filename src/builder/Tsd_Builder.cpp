@@ -17,10 +17,6 @@ using tsd_detail::startsWithNoCase;
 
 namespace {
 
-const char* orEmpty(const char* text) {
-    return text != nullptr ? text : "";
-}
-
 short saturatingAdd(short count, long n) {
     long sum = static_cast<long>(count) + n;
     if (sum > SHRT_MAX)
