@@ -397,6 +397,8 @@ bool Reader::readName(Gap gap, const char*& out) {
         return false;
     if (!isName(t))
         return fail(CONSTRAINT_ERR_EXPECTED_NAME, t);
+    if (!checkNotEmpty(t))
+        return false;
     out = text(t);
     advance();
     return true;
@@ -537,6 +539,8 @@ bool Reader::readDelay(Gap gap, const QuantitySpec& spec, Delay& out) {
     // A link: a quoted TSid, or a word that begins with "TS".
     std::uint32_t nameLength = 0;
     if (t.type == TokenType::Quoted) {
+        if (!checkNotEmpty(t))
+            return false;
         out.link = text(t);
         nameLength = t.length;
     } else if (t.type == TokenType::Word && t.length >= 2 && upper(m_text[t.start]) == 'T' &&

@@ -119,6 +119,10 @@ public:
     bool isName(const Token& t) const {
         return t.type == TokenType::Word || t.type == TokenType::Quoted;
     }
+    // The error for an empty quoted name (""), which names nothing.
+    bool checkNotEmpty(const Token& t) {
+        return t.length > 0 || fail(CONSTRAINT_ERR_EXPECTED_NAME, t);
+    }
     bool at(Keyword keyword) const { return isKeyword(tok(), keyword); }
     static bool isKeyword(const Token& t, Keyword keyword) {
         return t.type == TokenType::Word && t.keyword == keyword;

@@ -88,7 +88,7 @@ private:
             const Token& m = r.tok();
             if (!r.isName(m))
                 break;
-            if (!firstMember && !r.checkGap(m, Gap::Normal))
+            if ((!firstMember && !r.checkGap(m, Gap::Normal)) || !r.checkNotEmpty(m))
                 return false;
             const bool nameFollows = r.isName(r.peek());
             endGap = Gap::Normal;
@@ -293,6 +293,8 @@ private:
         const char* name = nullptr;
         Gap endGap = Gap::Checked;
         if (r.isName(t)) {
+            if (!r.checkNotEmpty(t))
+                return false;
             name = r.text(t);
             r.advance();
             endGap = Gap::Normal;

@@ -103,7 +103,6 @@ TEST(LogicalParser, CanonicalOffsetAndPathControlForms) {
          "TOFFSET pad=pads IN 0 valid=- BEFORE clk hl=(null)"},
         {"ENABLE=delay_1 ;", "ENABLE delay_1"},
         {"DISABLE= ;", "DISABLE (null)"},
-        {"DISABLE=\"\" ;", "DISABLE "},
     });
 }
 
@@ -301,7 +300,11 @@ TEST(LogicalParser, SyntaxErrorsReportTokenAndColumn) {
          "DATAPATHONLY"},
         {"OFFSET=IN:2:BEFORE:clk:HIGH:LOW ;", CONSTRAINT_ERR_DUPLICATE, 29, "LOW"},
         {"OFFSET=IN:2:BEFORE:clk:TIMEGRP:a:TIMEGRP:b ;", CONSTRAINT_ERR_DUPLICATE, 34, "TIMEGRP"},
-        // quotes and characters
+        // quotes and characters; an empty quoted name names nothing
+        {"DISABLE=\"\" ;", CONSTRAINT_ERR_EXPECTED_NAME, 9, "\"\""},
+        {"TIMEGRP A=b:'' ;", CONSTRAINT_ERR_EXPECTED_NAME, 13, "''"},
+        {"OFFSET=IN:2:BEFORE:\"\" ;", CONSTRAINT_ERR_EXPECTED_NAME, 20, "\"\""},
+        {"TIMESPEC TS1=FROM:a:\"\"*2 ;", CONSTRAINT_ERR_EXPECTED_NAME, 21, "\"\""},
         {"TIMESPEC TS01=PERIOD:\"clk:10:nS ;", CONSTRAINT_ERR_UNBALANCED_QUOTE, 22,
          "\"clk:10:nS ;"},
         {"TIMEGRP A='b ;", CONSTRAINT_ERR_UNBALANCED_QUOTE, 11, "'b ;"},
