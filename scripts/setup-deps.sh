@@ -3,7 +3,8 @@
 # machine lacks. Does nothing when everything is present.
 set -euo pipefail
 
-packages=(cmake ninja-build g++ libgtest-dev libbenchmark-dev clang-format)
+packages=(cmake ninja-build g++ libgtest-dev libbenchmark-dev clang-format
+          clang libclang-rt-14-dev)
 
 missing=()
 for p in "${packages[@]}"; do
