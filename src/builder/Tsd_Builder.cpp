@@ -2,8 +2,8 @@
 // into objects of the design.
 #include "tsd/Tsd_Builder.h"
 
-#include "internal/Tsd_Report.h"
 #include "internal/Tsd_ObjText.h"
+#include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cctype>

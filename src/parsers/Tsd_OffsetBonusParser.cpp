@@ -1,8 +1,8 @@
 // The OFFSET feature reducer.
 #include "tsd/Tsd_Parsers.h"
 
-#include "internal/Tsd_Report.h"
 #include "internal/Tsd_ObjText.h"
+#include "internal/Tsd_Report.h"
 
 #include <cstdlib>
 #include <cstring>

@@ -2,8 +2,8 @@
 // ENABLE and DISABLE texts become user groups and specifications.
 #include "tsd/Tsd_Parsers.h"
 
-#include "internal/Tsd_Report.h"
 #include "internal/Tsd_ObjText.h"
+#include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Builder.h"
 
 #include <cstring>
