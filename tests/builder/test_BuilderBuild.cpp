@@ -367,3 +367,33 @@ TEST(BuilderBuild, OverriddenDefinitionsReplaceEarlierOnesWithoutLeaking) {
     // The displaced spec waits in the trash, where the design deletes it.
     EXPECT_EQ(built.design->getEndpointSpecTrash()->getCount(), 1);
 }
+
+TEST(BuilderBuild, ParseErrorsEchoTheDefinitionWithACaretUnderTheBadToken) {
+    MessageCapture capture;
+    Tsd_Builder builder;
+    builder.addUserGroupProp("h", "a::b");
+    builder.addSpecProp("TS01", "BOGUS:a:10:nS");
+    builder.addSpecProp("OFFSET", "IN 2 ns BEFORE clk junk");
+    // A TS property holding an OFFSET is parsed without the "TIMESPEC name="
+    // prefix; the caret still stands under the token in the echoed line.
+    builder.addSpecProp("TS_X", "TIMEGRP pads OFFSET = IN 2 ns BEFORE clk junk");
+    // A TIMEGRP met where a spec was expected has no group to fill.
+    builder.addSpecProp("TS_Y", "TIMEGRP:a=b:OFFSET:x");
+    EXPECT_EQ(builder.buildTSDesign(), nullptr);
+    EXPECT_EQ(capture.sink.errors(),
+              (std::vector<std::string>{
+                  "Processing TIMEGRP definition \"h=a::b\": Encountered bad token \":\" in "
+                  "TIMEGRP:\nh=a::b\n    ^\n",
+                  "Processing TIMESPEC definition \"TS01=BOGUS:a:10:nS\": Encountered bad token "
+                  "\"BOGUS\" in TIMESPEC:\nTS01=BOGUS:a:10:nS\n     ^\n",
+                  "Processing TIMESPEC definition \"OFFSET=IN 2 ns BEFORE clk junk\": Encountered "
+                  "bad token \"junk\" in TIMESPEC:\nOFFSET=IN 2 ns BEFORE clk junk\n"
+                  "                          ^\n",
+                  "Processing TIMESPEC definition \"TS_X=TIMEGRP pads OFFSET = IN 2 ns BEFORE clk "
+                  "junk\": Encountered bad token \"junk\" in TIMESPEC:\nTS_X=TIMEGRP pads OFFSET = "
+                  "IN 2 ns BEFORE clk junk\n"
+                  "                                              ^\n",
+                  "Processing TIMESPEC definition \"TS_Y=TIMEGRP:a=b:OFFSET:x\": Unable to parse "
+                  "TIMESPEC definition.\n"}));
+    EXPECT_EQ(builder.getNumError(), 5);
+}
