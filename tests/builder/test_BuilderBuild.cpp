@@ -397,3 +397,11 @@ TEST(BuilderBuild, ParseErrorsEchoTheDefinitionWithACaretUnderTheBadToken) {
                   "TIMESPEC definition.\n"}));
     EXPECT_EQ(builder.getNumError(), 5);
 }
+
+TEST(BuilderBuild, AnObjectOfAnotherClassInTheTIGListIsFatal) {
+    MessageCapture capture;
+    Tsd_Design design;
+    design.getTIGGroupList()->addObj(new Tsd_ClkGroup("not_a_tig"));
+    DesignBuilder builder(&design);
+    EXPECT_EQ(fatalText([&] { builder.buildTSDesign(); }), "Non-TIG group in list.\n");
+}

@@ -49,13 +49,18 @@ TEST(BuilderIntake, OneIdentifierForTwoKindsOfGroupIsAnError) {
     EXPECT_EQ(sync.getOwner(), nullptr);
     NamedRef thru("c");
     EXPECT_FALSE(builder.addRefProp(&thru, "TS_TPTHRU", "g"));
+    ASSERT_TRUE(builder.addRefProp(new NamedRef("d"), "TS_TPTHRU", "t"));
+    NamedRef tnm2("e");
+    EXPECT_FALSE(builder.addRefProp(&tnm2, "TS_TNM", "t"));
     EXPECT_EQ(capture.sink.errors(),
               (std::vector<std::string>{
                   "The identifier \"g\" is used for both a TPSYNC group and a TNM group. Group "
                   "identifiers must be unique.\n",
                   "The identifier \"g\" is used for both a TPTHRU group and a TNM group. Group "
+                  "identifiers must be unique.\n",
+                  "The identifier \"t\" is used for both a TNM group and a TPTHRU group. Group "
                   "identifiers must be unique.\n"}));
-    EXPECT_EQ(builder.getNumError(), 2);
+    EXPECT_EQ(builder.getNumError(), 3);
     EXPECT_EQ(builder.buildTSDesign(), nullptr); // errors from intake fail the build
 }
 
