@@ -107,6 +107,11 @@ private:
     void countError() { addError(1); }
     void addErrorCount(int n);
 
+    // Runs `process` over stored properties under a context made from
+    // `context`, then frees them.
+    template <class Result>
+    void processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props, const char* context,
+                            Result (Tsd_Builder::*process)(const char*, const char*));
     bool initUserGroupFromProp(Tsd_UserGroup* group, const char* value);
     Tsd_Spec* buildSpecFromProp(const char* name, const char* value);
     Tsd_Spec* buildNetSpecFromProp(const char* name, const char* value);

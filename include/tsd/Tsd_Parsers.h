@@ -120,6 +120,11 @@ private:
                                        Tsd_Builder* builder);
     // Leaves `spec` as the parse's result; whoever takes it owns it.
     void store(std::unique_ptr<Tsd_Spec> spec);
+    // Fills an offset, looks up its pad and register groups (when named) and
+    // keeps it when everything was found.
+    bool makeOffset(std::unique_ptr<Tsd_Offset> offset, const char* padGroup, const char* regGroup,
+                    bool in, double offsetPs, const double* validPs, bool before, const char* clock,
+                    const char* highLow);
     // Sets the delay or the link of a period or delay path from the decoded value.
     void setDelayOrLink(Tsd_EndpointSpec* spec, const char* linkTsid, bool multiply,
                         double valueOrFactor, bool isTime) const;

@@ -31,16 +31,8 @@ Tsd_Design* Tsd_Builder::buildTSDesign() {
     design();
 
     // 1. Group properties, in the order added.
-    if (m_groupProps != nullptr) {
-        for (std::unique_ptr<Tsd_Prop>& prop : *m_groupProps) {
-            setContext(translateMessage("TSDatabase", "Processing TIMEGRP definition \"%s=%s\": ",
-                                        prop->name.get(), prop->value.get()));
-            processGroupProp(prop->name.get(), prop->value.get());
-            prop.reset();
-        }
-        m_groupProps.reset();
-        setContext(nullptr);
-    }
+    processStoredProps(m_groupProps,
+                       "Processing TIMEGRP definition \"%s=%s\": ", &Tsd_Builder::processGroupProp);
 
     // 2. Groups that were named but never defined.
     Tsd_BaseObjListIter unresolved(&m_unresolvedGroups);
@@ -55,16 +47,8 @@ Tsd_Design* Tsd_Builder::buildTSDesign() {
     validateUserGroups();
 
     // 4. Spec properties, in the order added.
-    if (m_specProps != nullptr) {
-        for (std::unique_ptr<Tsd_Prop>& prop : *m_specProps) {
-            setContext(translateMessage("TSDatabase", "Processing TIMESPEC definition \"%s=%s\": ",
-                                        prop->name.get(), prop->value.get()));
-            processSpecProp(prop->name.get(), prop->value.get());
-            prop.reset();
-        }
-        m_specProps.reset();
-        setContext(nullptr);
-    }
+    processStoredProps(m_specProps,
+                       "Processing TIMESPEC definition \"%s=%s\": ", &Tsd_Builder::processSpecProp);
 
     // 5 to 7. What stayed pending.
     resolvePendingOffsets();
@@ -76,6 +60,22 @@ Tsd_Design* Tsd_Builder::buildTSDesign() {
     // From here on the caller owns the design.
     m_ownedDesign.release();
     return m_design;
+}
+
+template <class Result>
+void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
+                                     const char* context,
+                                     Result (Tsd_Builder::*process)(const char*, const char*)) {
+    if (props == nullptr)
+        return;
+    // Each message names the definition it comes from through the context.
+    for (std::unique_ptr<Tsd_Prop>& prop : *props) {
+        setContext(translateMessage("TSDatabase", context, prop->name.get(), prop->value.get()));
+        (this->*process)(prop->name.get(), prop->value.get());
+        prop.reset();
+    }
+    props.reset();
+    setContext(nullptr);
 }
 
 void Tsd_Builder::validateUserGroups() {

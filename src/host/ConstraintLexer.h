@@ -11,6 +11,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <utility>
 #include <vector>
@@ -238,5 +239,35 @@ Keyword classifyWord(const char* word, std::size_t length);
 // Length of the number at the start of [p, p + length): digits with an
 // optional point and exponent, and a sign when allowed; 0 when none.
 std::size_t scanNumber(const char* p, std::size_t length, bool allowSign);
+
+// The reader for one parse. A callback that parses again on the same parser
+// gets a reader of its own, so the strings handed to the outer callback stay
+// intact; `parsing` tells whether a parse is under way.
+class ReaderLease {
+public:
+    ReaderLease(Reader& own, bool& parsing) : m_parsing(parsing), m_outer(!parsing) {
+        if (m_outer) {
+            m_reader = &own;
+        } else {
+            m_nested = std::make_unique<Reader>();
+            m_reader = m_nested.get();
+        }
+        m_parsing = true;
+    }
+    ~ReaderLease() {
+        if (m_outer)
+            m_parsing = false;
+    }
+    ReaderLease(const ReaderLease&) = delete;
+    ReaderLease& operator=(const ReaderLease&) = delete;
+
+    Reader& get() { return *m_reader; }
+
+private:
+    bool& m_parsing;
+    bool m_outer;
+    std::unique_ptr<Reader> m_nested;
+    Reader* m_reader = nullptr;
+};
 
 } // namespace tsd_constraint

@@ -153,39 +153,35 @@ private:
         return r.fail(CONSTRAINT_ERR_EXPECTED_VALUE, body);
     }
 
+    // One FROM, THRU or TO keyword and the group name after it.
+    bool pathPoint(Gap& gap) {
+        if (!r.checkGap(r.tok(), gap))
+            return false;
+        r.advance();
+        const char* name = nullptr;
+        if (!r.readName(Gap::Normal, name))
+            return false;
+        r.names.push_back(name);
+        gap = Gap::Normal;
+        return true;
+    }
+
     // [FROM name] {THRU name} [TO name] (delay [DATAPATHONLY] | TIG) [PRIORITY n]
     bool path(const Token& first, const char* tsid) {
         bool hasFrom = false, hasTo = false;
         Gap gap = Gap::Checked; // the '=' before the first word was checked
-        const char* name = nullptr;
         if (r.at(KW_FROM)) {
-            if (!r.checkGap(r.tok(), gap))
+            if (!pathPoint(gap))
                 return false;
-            r.advance();
-            if (!r.readName(Gap::Normal, name))
-                return false;
-            r.names.push_back(name);
             hasFrom = true;
-            gap = Gap::Normal;
         }
-        while (r.at(KW_THRU)) {
-            if (!r.checkGap(r.tok(), gap))
+        while (r.at(KW_THRU))
+            if (!pathPoint(gap))
                 return false;
-            r.advance();
-            if (!r.readName(Gap::Normal, name))
-                return false;
-            r.names.push_back(name);
-            gap = Gap::Normal;
-        }
         if (r.at(KW_TO)) {
-            if (!r.checkGap(r.tok(), gap))
+            if (!pathPoint(gap))
                 return false;
-            r.advance();
-            if (!r.readName(Gap::Normal, name))
-                return false;
-            r.names.push_back(name);
             hasTo = true;
-            gap = Gap::Normal;
         }
 
         int priority = LogicalConstraintParser::kNoPriority;
@@ -317,24 +313,8 @@ LogicalConstraintParser::LogicalConstraintParser() : m_reader(std::make_unique<R
 LogicalConstraintParser::~LogicalConstraintParser() = default;
 
 bool LogicalConstraintParser::parse(const char* text) {
-    // A callback that parses again on the same parser gets buffers of its
-    // own, so the strings handed to the outer callback stay intact.
-    std::unique_ptr<Reader> nested;
-    Reader* reader = m_reader.get();
-    if (m_parsing) {
-        nested = std::make_unique<Reader>();
-        reader = nested.get();
-    }
-    const bool outer = !m_parsing;
-    m_parsing = true;
-    struct Reset {
-        bool& flag;
-        bool outer;
-        ~Reset() {
-            if (outer)
-                flag = false;
-        }
-    } reset{m_parsing, outer};
+    tsd_constraint::ReaderLease lease(*m_reader, m_parsing);
+    Reader* reader = &lease.get();
 
     bool ok = reader->start(text);
     if (ok) {

@@ -68,23 +68,8 @@ NetConstraintParser::NetConstraintParser() : m_reader(std::make_unique<Reader>()
 NetConstraintParser::~NetConstraintParser() = default;
 
 bool NetConstraintParser::parse(const char* text) {
-    // A callback that parses again gets buffers of its own (see the logical parser).
-    std::unique_ptr<Reader> nested;
-    Reader* reader = m_reader.get();
-    if (m_parsing) {
-        nested = std::make_unique<Reader>();
-        reader = nested.get();
-    }
-    const bool outer = !m_parsing;
-    m_parsing = true;
-    struct Reset {
-        bool& flag;
-        bool outer;
-        ~Reset() {
-            if (outer)
-                flag = false;
-        }
-    } reset{m_parsing, outer};
+    tsd_constraint::ReaderLease lease(*m_reader, m_parsing);
+    Reader* reader = &lease.get();
 
     bool ok = reader->start(text) && netDefinition(*this, *reader);
     if (!ok && reader->failed())

@@ -79,4 +79,37 @@ void dumpScope(DumpStream& stream, short indent, const char* scope) {
         dumpLine(stream, indent, std::string("   constraint scope: ") + scope);
 }
 
+void appendDutyAndJitter(std::string& text, const Tsd_TimeValue* dutyValue, double dutyPercent,
+                         bool high, const Tsd_TimeValue* inputJitter) {
+    if (dutyValue != nullptr || dutyPercent != 0.0) {
+        text += high ? ":HIGH:" : ":LOW:";
+        if (dutyValue != nullptr) {
+            text += propTime(*dutyValue);
+        } else {
+            text += formatNumber(dutyPercent);
+            text += '%';
+        }
+    }
+    if (inputJitter != nullptr) {
+        text += ":INPUT_JITTER:";
+        text += propTime(*inputJitter);
+    }
+}
+
+void dumpDutyCycle(DumpStream& stream, short indent, const Tsd_TimeValue* dutyValue,
+                   double dutyPercent, bool high) {
+    const char* level = high ? "HIGH " : "LOW ";
+    if (dutyValue != nullptr)
+        dumpLine(stream, indent,
+                 std::string("   absolute duty cycle: ") + level + dumpTime(*dutyValue));
+    else
+        dumpLine(stream, indent, "   absolute duty cycle unset");
+    if (dutyPercent != 0.0)
+        dumpLine(stream, indent,
+                 std::string("   percent duty cycle: ") + level +
+                     formatMessage("%f%%", dutyPercent));
+    else
+        dumpLine(stream, indent, "   percent duty cycle unset");
+}
+
 } // namespace tsd_detail

@@ -38,6 +38,16 @@ std::string dumpTime(const Tsd_TimeValue& value);
 // A time value as properties write it ("10:nS"), copied out of the buffer.
 std::string propTime(const Tsd_TimeValue& value);
 
+// The duty-cycle and input-jitter part of a period's property text:
+// ":HIGH:" or ":LOW:" and the time or the percent when a duty cycle is set,
+// then ":INPUT_JITTER:" and the jitter when one is set.
+void appendDutyAndJitter(std::string& text, const Tsd_TimeValue* dutyValue, double dutyPercent,
+                         bool high, const Tsd_TimeValue* inputJitter);
+
+// The two duty-cycle lines of a period's dump: absolute, then percent.
+void dumpDutyCycle(DumpStream& stream, short indent, const Tsd_TimeValue* dutyValue,
+                   double dutyPercent, bool high);
+
 // The property of a reference group: its reference-property name and its
 // own name (empty when null), in the group property buffers.
 bool refGroupProp(const char* propName, const char* groupName, const char*& name,

@@ -261,58 +261,55 @@ bool Tsd_SpecGroupParser::cb_timegrp(
     return true;
 }
 
+bool Tsd_SpecGroupParser::makeOffset(std::unique_ptr<Tsd_Offset> offset, const char* padGroup,
+                                     const char* regGroup, bool in, double offsetPs,
+                                     const double* validPs, bool before, const char* clock,
+                                     const char* highLow) {
+    bool ok = addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock, highLow, m_builder,
+                            m_bonusParser.get());
+    // Both groups are always looked up, so that each missing one is reported.
+    if (padGroup != nullptr) {
+        Tsd_TermGroup* pads = m_builder->getTermGroupForSpec(padGroup);
+        if (pads != nullptr)
+            offset->getGroupOffset()->setPadGroup(pads);
+        ok = ok && pads != nullptr;
+    }
+    if (regGroup != nullptr) {
+        Tsd_TermGroup* regs = m_builder->getTermGroupForSpec(regGroup);
+        if (regs != nullptr)
+            offset->setRegGroup(regs);
+        ok = ok && regs != nullptr;
+    }
+    if (ok)
+        store(std::move(offset));
+    return true;
+}
+
 bool Tsd_SpecGroupParser::cb_offset(bool in, double offsetPs, const double* validPs, bool before,
                                     const char* clock, const char* highLow,
                                     const ConstraintHandle* /*handle*/) {
-    auto offset = std::make_unique<Tsd_Offset>();
-    if (addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock, highLow, m_builder,
-                      m_bonusParser.get()))
-        store(std::move(offset));
-    return true;
+    return makeOffset(std::make_unique<Tsd_Offset>(), nullptr, nullptr, in, offsetPs, validPs,
+                      before, clock, highLow);
 }
 
 bool Tsd_SpecGroupParser::cb_roffset(bool in, double offsetPs, const double* validPs, bool before,
                                      const char* clock, const char* regGroup, const char* highLow,
                                      const ConstraintHandle* /*handle*/) {
-    auto offset = std::make_unique<Tsd_Offset>();
-    bool ok = addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock, highLow, m_builder,
-                            m_bonusParser.get());
-    Tsd_TermGroup* regs = m_builder->getTermGroupForSpec(regGroup);
-    if (regs != nullptr)
-        offset->setRegGroup(regs);
-    if (ok && regs != nullptr)
-        store(std::move(offset));
-    return true;
+    return makeOffset(std::make_unique<Tsd_Offset>(), nullptr, regGroup, in, offsetPs, validPs,
+                      before, clock, highLow);
 }
 
 bool Tsd_SpecGroupParser::cb_toffset(const char* padGroup, bool in, double offsetPs,
                                      const double* validPs, bool before, const char* clock,
                                      const char* highLow, const ConstraintHandle* /*handle*/) {
-    auto offset = std::make_unique<Tsd_GroupOffset>();
-    bool ok = addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock, highLow, m_builder,
-                            m_bonusParser.get());
-    Tsd_TermGroup* pads = m_builder->getTermGroupForSpec(padGroup);
-    if (pads != nullptr)
-        offset->setPadGroup(pads);
-    if (ok && pads != nullptr)
-        store(std::move(offset));
-    return true;
+    return makeOffset(std::make_unique<Tsd_GroupOffset>(), padGroup, nullptr, in, offsetPs, validPs,
+                      before, clock, highLow);
 }
 
 bool Tsd_SpecGroupParser::cb_troffset(const char* padGroup, bool in, double offsetPs,
                                       const double* validPs, bool before, const char* clock,
                                       const char* regGroup, const char* highLow,
                                       const ConstraintHandle* /*handle*/) {
-    auto offset = std::make_unique<Tsd_GroupOffset>();
-    bool ok = addBaseOffset(offset.get(), in, offsetPs, validPs, before, clock, highLow, m_builder,
-                            m_bonusParser.get());
-    Tsd_TermGroup* pads = m_builder->getTermGroupForSpec(padGroup);
-    if (pads != nullptr)
-        offset->setPadGroup(pads);
-    Tsd_TermGroup* regs = m_builder->getTermGroupForSpec(regGroup);
-    if (regs != nullptr)
-        offset->setRegGroup(regs);
-    if (ok && pads != nullptr && regs != nullptr)
-        store(std::move(offset));
-    return true;
+    return makeOffset(std::make_unique<Tsd_GroupOffset>(), padGroup, regGroup, in, offsetPs,
+                      validPs, before, clock, highLow);
 }

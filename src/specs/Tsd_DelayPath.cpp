@@ -68,10 +68,7 @@ bool Tsd_DelayPath::getProp(const char*& name, const char*& value) const {
         text += ":DATAPATHONLY";
     if (hasPriority())
         text += formatString(":PRIORITY:%ld", static_cast<long>(getPriority()));
-    tsd_detail::PropBuffers& buffers = tsd_detail::specPropBuffers();
-    buffers.name.copy(getTSid());
-    buffers.value.copy(text.c_str());
-    return buffers.handOut(name, value);
+    return tsd_detail::specPropBuffers().set(getTSid(), text.c_str(), name, value);
 }
 
 void Tsd_DelayPath::dump(DumpStream& stream, short indent) const {

@@ -29,10 +29,7 @@ void dumpTimeLine(DumpStream& stream, short indent, const char* label,
 
 bool handOutSpecProp(const std::string& propName, const std::string& text, const char*& name,
                      const char*& value) {
-    tsd_detail::PropBuffers& buffers = tsd_detail::specPropBuffers();
-    buffers.name.copy(propName.c_str());
-    buffers.value.copy(text.c_str());
-    return buffers.handOut(name, value);
+    return tsd_detail::specPropBuffers().set(propName.c_str(), text.c_str(), name, value);
 }
 
 } // namespace
@@ -125,19 +122,8 @@ void Tsd_NetTiming::clearInputJitter() {
 bool Tsd_NetTiming::getProp(const char*& name, const char*& value) const {
     if (m_period != nullptr) {
         std::string text = propTime(*m_period);
-        if (hasDutyCycle()) {
-            text += m_dutyCycleHigh ? ":HIGH:" : ":LOW:";
-            if (m_dutyCycleValue != nullptr) {
-                text += propTime(*m_dutyCycleValue);
-            } else {
-                text += formatNumber(m_dutyCyclePercent);
-                text += '%';
-            }
-        }
-        if (m_inputJitter != nullptr) {
-            text += ":INPUT_JITTER:";
-            text += propTime(*m_inputJitter);
-        }
+        tsd_detail::appendDutyAndJitter(text, m_dutyCycleValue.get(), m_dutyCyclePercent,
+                                        m_dutyCycleHigh, m_inputJitter.get());
         return handOutSpecProp("TS_PERIOD", text, name, value);
     }
     if (m_maxDelay != nullptr)
@@ -148,20 +134,10 @@ bool Tsd_NetTiming::getProp(const char*& name, const char*& value) const {
 }
 
 void Tsd_NetTiming::dump(DumpStream& stream, short indent) const {
-    const char* level = m_dutyCycleHigh ? "HIGH " : "LOW ";
     dumpLine(stream, indent, "Tsd_NetTiming");
     dumpTimeLine(stream, indent, "period value", m_period);
-    if (m_dutyCycleValue != nullptr)
-        dumpLine(stream, indent,
-                 std::string("   absolute duty cycle: ") + level + dumpTime(*m_dutyCycleValue));
-    else
-        dumpLine(stream, indent, "   absolute duty cycle unset");
-    if (m_dutyCyclePercent != 0.0)
-        dumpLine(stream, indent,
-                 std::string("   percent duty cycle: ") + level +
-                     formatMessage("%f%%", m_dutyCyclePercent));
-    else
-        dumpLine(stream, indent, "   percent duty cycle unset");
+    tsd_detail::dumpDutyCycle(stream, indent, m_dutyCycleValue.get(), m_dutyCyclePercent,
+                              m_dutyCycleHigh);
     dumpTimeLine(stream, indent, "input jitter", m_inputJitter);
     dumpTimeLine(stream, indent, "max-delay value", m_maxDelay);
     dumpTimeLine(stream, indent, "max-skew value", m_maxSkew);

@@ -15,50 +15,16 @@ using tsd_detail::propTime;
 
 namespace {
 
-// The clock edge is written with the words the parser reads it from.
-const char* clockEdgeWord(Tsd_UserGroup::Edge edge) {
-    switch (edge) {
-    case Tsd_UserGroup::EDGE_RISING:
-        return "HIGH";
-    case Tsd_UserGroup::EDGE_FALLING:
-        return "LOW";
-    case Tsd_UserGroup::EDGE_TRANSHI:
-        return "TRANSHI";
-    case Tsd_UserGroup::EDGE_TRANSLO:
-        return "TRANSLO";
-    default:
-        return "";
-    }
-}
+// Words for the four edges, RISING to TRANSLO; anything else has none. The
+// clock edge is written with the words the parser reads it from.
+using EdgeWords = const char* const[4];
+const EdgeWords kClockEdgeWords = {"HIGH", "LOW", "TRANSHI", "TRANSLO"};
+const EdgeWords kRegEdgeWords = {"RISING", "FALLING", "TRANSHI", "TRANSLO"};
+const EdgeWords kDumpEdgeWords = {"Rising", "Falling", "Transparent High", "Transparent Low"};
 
-const char* regEdgeWord(Tsd_UserGroup::Edge edge) {
-    switch (edge) {
-    case Tsd_UserGroup::EDGE_RISING:
-        return "RISING";
-    case Tsd_UserGroup::EDGE_FALLING:
-        return "FALLING";
-    case Tsd_UserGroup::EDGE_TRANSHI:
-        return "TRANSHI";
-    case Tsd_UserGroup::EDGE_TRANSLO:
-        return "TRANSLO";
-    default:
-        return "";
-    }
-}
-
-const char* dumpEdgeWord(Tsd_UserGroup::Edge edge) {
-    switch (edge) {
-    case Tsd_UserGroup::EDGE_RISING:
-        return "Rising";
-    case Tsd_UserGroup::EDGE_FALLING:
-        return "Falling";
-    case Tsd_UserGroup::EDGE_TRANSHI:
-        return "Transparent High";
-    case Tsd_UserGroup::EDGE_TRANSLO:
-        return "Transparent Low";
-    default:
-        return "";
-    }
+const char* edgeWord(Tsd_UserGroup::Edge edge, const EdgeWords& words) {
+    return edge >= Tsd_UserGroup::EDGE_RISING && edge <= Tsd_UserGroup::EDGE_TRANSLO ? words[edge]
+                                                                                     : "";
 }
 
 std::unique_ptr<Tsd_TimeValue> copyOf(const std::unique_ptr<Tsd_TimeValue>& value) {
@@ -75,7 +41,8 @@ void dumpGroup(DumpStream& stream, short indent, const char* label, const Tsd_Gr
 
 void dumpEdge(DumpStream& stream, short indent, const char* label, Tsd_UserGroup::Edge edge) {
     if (edge != Tsd_UserGroup::EDGE_ANY)
-        dumpLine(stream, indent, std::string("   ") + label + ": " + dumpEdgeWord(edge));
+        dumpLine(stream, indent,
+                 std::string("   ") + label + ": " + edgeWord(edge, kDumpEdgeWords));
     else
         dumpLine(stream, indent, std::string("   ") + label + " unset");
 }
@@ -88,10 +55,7 @@ std::string annoName(const Tsd_Group* group) {
 
 bool handOutSpecProp(const char* propName, const std::string& text, const char*& name,
                      const char*& value) {
-    tsd_detail::PropBuffers& buffers = tsd_detail::specPropBuffers();
-    buffers.name.copy(propName);
-    buffers.value.copy(text.c_str());
-    return buffers.handOut(name, value);
+    return tsd_detail::specPropBuffers().set(propName, text.c_str(), name, value);
 }
 
 } // namespace
@@ -153,11 +117,11 @@ const char* Tsd_Offset::getSharedString() const {
     }
     if (m_refClockEdge != Tsd_UserGroup::EDGE_ANY) {
         text += ':';
-        text += clockEdgeWord(m_refClockEdge);
+        text += edgeWord(m_refClockEdge, kClockEdgeWords);
     }
     if (m_regGroupEdge != Tsd_UserGroup::EDGE_ANY) {
         text += ':';
-        text += regEdgeWord(m_regGroupEdge);
+        text += edgeWord(m_regGroupEdge, kRegEdgeWords);
     }
     buffer.copy(text.c_str());
     return buffer.getBuffer();

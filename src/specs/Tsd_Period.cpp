@@ -94,46 +94,22 @@ bool Tsd_Period::getProp(const char*& name, const char*& value) const {
         text += m_phasePositive ? ":PHASE:+:" : ":PHASE:-:";
         text += propTime(*m_phase);
     }
-    if (hasDutyCycle()) {
-        text += m_dutyCycleHigh ? ":HIGH:" : ":LOW:";
-        if (m_dutyCycleValue != nullptr) {
-            text += propTime(*m_dutyCycleValue);
-        } else {
-            text += formatNumber(m_dutyCyclePercent);
-            text += '%';
-        }
-    }
-    if (m_inputJitter != nullptr) {
-        text += ":INPUT_JITTER:";
-        text += propTime(*m_inputJitter);
-    }
+    tsd_detail::appendDutyAndJitter(text, m_dutyCycleValue.get(), m_dutyCyclePercent,
+                                    m_dutyCycleHigh, m_inputJitter.get());
     if (hasPriority())
         text += formatString(":PRIORITY:%ld", static_cast<long>(getPriority()));
-    tsd_detail::PropBuffers& buffers = tsd_detail::specPropBuffers();
-    buffers.name.copy(getTSid());
-    buffers.value.copy(text.c_str());
-    return buffers.handOut(name, value);
+    return tsd_detail::specPropBuffers().set(getTSid(), text.c_str(), name, value);
 }
 
 void Tsd_Period::dump(DumpStream& stream, short indent) const {
-    const char* level = m_dutyCycleHigh ? "HIGH " : "LOW ";
     dumpLine(stream, indent, std::string("Tsd_Period ") + orEmpty(getTSid()));
     if (m_periodGroup != nullptr)
         dumpLine(stream, indent,
                  std::string("   period group: ") + orEmpty(m_periodGroup->getName()));
     else
         dumpLine(stream, indent, "   period group unset");
-    if (m_dutyCycleValue != nullptr)
-        dumpLine(stream, indent,
-                 std::string("   absolute duty cycle: ") + level + dumpTime(*m_dutyCycleValue));
-    else
-        dumpLine(stream, indent, "   absolute duty cycle unset");
-    if (m_dutyCyclePercent != 0.0)
-        dumpLine(stream, indent,
-                 std::string("   percent duty cycle: ") + level +
-                     formatMessage("%f%%", m_dutyCyclePercent));
-    else
-        dumpLine(stream, indent, "   percent duty cycle unset");
+    tsd_detail::dumpDutyCycle(stream, indent, m_dutyCycleValue.get(), m_dutyCyclePercent,
+                              m_dutyCycleHigh);
     if (m_phase != nullptr)
         dumpLine(stream, indent,
                  "   phase: " + dumpTime(*m_phase) + (m_phasePositive ? " +" : " -"));
