@@ -114,6 +114,8 @@ private:
                             Result (Tsd_Builder::*process)(const char*, const char*));
     bool initUserGroupFromProp(Tsd_UserGroup* group, const char* value);
     Tsd_Spec* buildSpecFromProp(const char* name, const char* value);
+    // Removes the pending-link record of `spec`, if it has one.
+    void dropPendingLink(const Tsd_Spec* spec);
     Tsd_Spec* buildNetSpecFromProp(const char* name, const char* value);
     Tsd_Group* getSimpleGroup(const char* name, const char* value);
 

@@ -309,18 +309,16 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
         Tsd_EndpointSpec* existing = d.findEndpointSpecByTSid(endpoint->getTSid(), false);
         if (existing != nullptr) {
             if (!allowEndpointSpecOverride(existing, value)) {
+                // The refused spec may already wait for a link: that record
+                // goes with it.
+                dropPendingLink(spec);
                 delete spec;
                 return nullptr;
             }
             // The displaced spec goes to the trash, where pointers to it stay
             // valid and the design deletes it in the end.
             d.moveEndpointSpecToTrash(existing);
-            for (auto it = m_pendingLinks.begin(); it != m_pendingLinks.end(); ++it) {
-                if (*it != nullptr && (*it)->spec == existing) {
-                    m_pendingLinks.erase(it);
-                    break;
-                }
-            }
+            dropPendingLink(existing);
         }
         d.addEndpointSpec(endpoint);
     } else if (Tsd_Offset* offset = spec->getOffset()) {
@@ -329,6 +327,15 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
         d.addPathControl(control);
     }
     return spec;
+}
+
+void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec) {
+    for (auto it = m_pendingLinks.begin(); it != m_pendingLinks.end(); ++it) {
+        if (*it != nullptr && (*it)->spec == spec) {
+            m_pendingLinks.erase(it);
+            return;
+        }
+    }
 }
 
 Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {

@@ -95,6 +95,18 @@ TEST(BuilderBuild, TimegrpMembersOfTheWrongKindAndIdentifierClashes) {
                   "identifiers must be unique.\n"}));
 }
 
+TEST(BuilderBuild, ARefusedSecondDefinitionTakesItsPendingLinkAlong) {
+    // The second TS01 waits for TS09 when it is refused and deleted: its
+    // pending record must not outlive it.
+    MessageCapture capture;
+    Built built = build(withSpecs({{"TS01", "PERIOD:ffs:TS09*2"},
+                                   {"TS01", "PERIOD:ffs:TS09*3"},
+                                   {"TS09", "PERIOD:ram:4:nS"}}));
+    EXPECT_EQ(built.design, nullptr);
+    EXPECT_EQ(built.errors, 1); // the second definition only
+    EXPECT_EQ(capture.sink.errors().size(), 1u);
+}
+
 TEST(BuilderBuild, SecondDefinitionsAreRefusedByDefault) {
     MessageCapture capture;
     PropSet set = withGroups({{"g", "ffs"}, {"g", "ram"}});
