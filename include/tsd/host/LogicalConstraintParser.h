@@ -37,7 +37,7 @@ enum ConstraintErrorCode {
 // codes outside the enumeration.
 const char* constraintErrorText(int code);
 
-enum ParserEdge {
+enum ParserEdge : int {
     PARSER_EDGE_RISING = 0,
     PARSER_EDGE_FALLING = 1,
     PARSER_EDGE_TRANSHI = 2,
