@@ -45,7 +45,8 @@ std::string objectName(Tsd_BaseObj* obj) {
         if (Tsd_PathControl* control = obj->getPathControl())
             return control->getDelayName() != nullptr ? control->getDelayName() : "";
     }
-    return objectProp(obj).value;
+    ObjectProp prop = objectProp(obj);
+    return prop.name + "=" + prop.value;
 }
 
 ObjectProp objectProp(const Tsd_BaseObj* obj) {

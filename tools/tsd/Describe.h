@@ -11,8 +11,8 @@ namespace tsd_cli {
 // "delay path", "offset", ...
 const char* objectClass(Tsd_BaseObj* obj);
 
-// What names the object: a group's name, a spec's TSid, or, for objects
-// without either, their canonical value.
+// What names the object: a group's name, a spec's TSid, a path control's
+// delay name, or, for objects without any, their canonical "name=value".
 std::string objectName(Tsd_BaseObj* obj);
 
 // The object's canonical property, copied (the library's buffer is reused).

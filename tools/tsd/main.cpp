@@ -65,6 +65,18 @@ int main(int argc, char** argv) {
     graph->add_option("file", file, kFileHelp)->required();
     graph->add_option("-o,--output", options.outFile, "write to this file instead of stdout");
 
+    // A first word that is neither an option nor a command is a typo.
+    if (argc > 1 && argv[1][0] != '-') {
+        bool known = false;
+        for (const CLI::App* sub : app.get_subcommands({}))
+            known = known || sub->check_name(argv[1]);
+        if (!known) {
+            std::cerr << "tsd: error: unknown command \"" << argv[1] << "\"\n"
+                      << "Run 'tsd --help' for usage.\n";
+            return tsd_cli::kExitUsage;
+        }
+    }
+
     try {
         app.parse(argc, argv);
     } catch (const CLI::ParseError& e) {
