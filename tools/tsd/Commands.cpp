@@ -8,6 +8,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <fstream>
@@ -305,7 +306,11 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         return kExitErrors;
 
     json withdrawn = json::array();
+    std::vector<std::string> seen;
     for (const std::string& element : elements) {
+        if (std::find(seen.begin(), seen.end(), element) != seen.end())
+            continue; // named twice: the first time took every record
+        seen.push_back(element);
         int count = session.withdraw(element);
         withdrawn.push_back({{"element", element}, {"records", count}});
         if (count == 0)

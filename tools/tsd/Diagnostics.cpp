@@ -31,19 +31,10 @@ std::string withoutFinalNewline(std::string text) {
     return text;
 }
 
-bool startsWith(const std::string& text, const std::string& prefix) {
-    return text.compare(0, prefix.size(), prefix) == 0;
-}
-
 // The text passes through the library's 16-bit strings on its way into a
 // context; do the same so that the two compare equal.
 std::string asLibraryText(const std::string& text) {
     return utf16ToUtf8(utf8ToUtf16(text.c_str()).c_str());
-}
-
-bool namesWord(const PropLine& prop, const std::string& word) {
-    std::vector<std::string> words = valueWords(prop.value);
-    return std::find(words.begin(), words.end(), word) != words.end();
 }
 
 // Messages issued outside any stored property quote the names they are about.
@@ -98,47 +89,81 @@ bool isRefNamed(const PropLine& prop, const char* name) {
     return true;
 }
 
-const PropLine* findLine(const std::vector<PropLine>& props, Target target,
-                         const std::string& name) {
-    auto first = [&](auto&& pred) -> const PropLine* {
-        for (const PropLine& prop : props)
-            if (pred(prop))
-                return &prop;
-        return nullptr;
-    };
-    switch (target) {
-    case Target::GroupNaming:
-        return first(
-            [&](const PropLine& p) { return p.kind == PropKind::Group && namesWord(p, name); });
-    case Target::GroupDefining:
-        return first(
-            [&](const PropLine& p) { return p.kind == PropKind::Group && p.name == name; });
-    case Target::SpecDefining:
-        return first([&](const PropLine& p) { return p.kind == PropKind::Spec && p.name == name; });
-    case Target::RegGroupUser:
-        if (const PropLine* ref = first([&](const PropLine& p) {
-                return isRefNamed(p, "TS_OFFSET") && namesWord(p, name);
-            }))
-            return ref;
-        return first(
-            [&](const PropLine& p) { return p.kind == PropKind::Spec && namesWord(p, name); });
-    case Target::ClockUser:
-        return first([&](const PropLine& p) {
-            return (p.kind == PropKind::Spec || isRefNamed(p, "TS_OFFSET") ||
-                    isRefNamed(p, "TS_FEEDBACK")) &&
-                   namesWord(p, name);
-        });
-    case Target::TigReference:
-        return first([&](const PropLine& p) { return isRefNamed(p, "TS_TIG") && p.value == name; });
+// The first line that defines or names each word, per kind of line, made in
+// one pass so that many messages cost no more than a few.
+class NameIndex {
+public:
+    explicit NameIndex(const std::vector<PropLine>& props) {
+        for (const PropLine& prop : props) {
+            if (prop.kind == PropKind::Group) {
+                m_groupDefining.emplace(prop.name, &prop);
+                addWords(m_groupNaming, prop);
+            } else if (prop.kind == PropKind::Spec) {
+                m_specDefining.emplace(prop.name, &prop);
+                addWords(m_specNaming, prop);
+            } else if (isRefNamed(prop, "TS_OFFSET")) {
+                addWords(m_offsetRefNaming, prop);
+            } else if (isRefNamed(prop, "TS_FEEDBACK")) {
+                addWords(m_feedbackRefNaming, prop);
+            } else if (isRefNamed(prop, "TS_TIG")) {
+                m_tigRefs.emplace(prop.value, &prop);
+            }
+        }
     }
-    return nullptr;
-}
 
-const PropLine* lineForQuotedName(const std::vector<PropLine>& props, const std::string& text) {
+    const PropLine* find(Target target, const std::string& name) const {
+        switch (target) {
+        case Target::GroupNaming:
+            return lookup(m_groupNaming, name);
+        case Target::GroupDefining:
+            return lookup(m_groupDefining, name);
+        case Target::SpecDefining:
+            return lookup(m_specDefining, name);
+        case Target::RegGroupUser:
+            return first(lookup(m_offsetRefNaming, name), lookup(m_specNaming, name));
+        case Target::ClockUser:
+            return first(first(lookup(m_specNaming, name), lookup(m_offsetRefNaming, name)),
+                         lookup(m_feedbackRefNaming, name));
+        case Target::TigReference:
+            return lookup(m_tigRefs, name);
+        }
+        return nullptr;
+    }
+
+private:
+    using Index = std::map<std::string, const PropLine*>;
+
+    static void addWords(Index& index, const PropLine& prop) {
+        for (std::string& word : valueWords(prop.value))
+            index.emplace(std::move(word), &prop); // the first line keeps the word
+    }
+    static const PropLine* lookup(const Index& index, const std::string& name) {
+        auto found = index.find(name);
+        return found != index.end() ? found->second : nullptr;
+    }
+    // The earlier of two lines (lines are in input order in one vector).
+    static const PropLine* first(const PropLine* a, const PropLine* b) {
+        if (a == nullptr)
+            return b;
+        if (b == nullptr)
+            return a;
+        return a < b ? a : b;
+    }
+
+    Index m_groupDefining;
+    Index m_groupNaming;
+    Index m_specDefining;
+    Index m_specNaming;
+    Index m_offsetRefNaming;
+    Index m_feedbackRefNaming;
+    Index m_tigRefs;
+};
+
+const PropLine* lineForQuotedName(const NameIndex& index, const std::string& text) {
     std::smatch match;
     for (const NamePattern& pattern : namePatterns())
         if (std::regex_search(text, match, pattern.pattern))
-            return findLine(props, pattern.target, match[1].str());
+            return index.find(pattern.target, match[1].str());
     return nullptr;
 }
 
@@ -192,10 +217,12 @@ std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& prop
                                                const std::vector<RawMessage>& messages,
                                                const std::string& fallbackFile) {
     std::vector<Diagnostic> diags;
-    std::vector<std::string> contexts(props.size());
+    // The stored lines of each context, in input order.
+    std::map<std::string, std::vector<int>> linesOf;
     for (std::size_t i = 0; i < props.size(); ++i)
         if (props[i].kind != PropKind::Ref)
-            contexts[i] = processingContext(props[i]);
+            linesOf[processingContext(props[i])].push_back(static_cast<int>(i));
+    NameIndex names(props);
 
     // Stored lines are processed in order, groups before specs, so the line
     // of a context never lies before the line of the previous message of
@@ -207,37 +234,28 @@ std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& prop
     std::map<int, std::set<std::string>> textsOnLine;
 
     for (const RawMessage& message : messages) {
-        const PropLine* prop = nullptr;
         bool isDetail = message.severity == MessageSeverity::Status && !message.text.empty() &&
                         (message.text[0] == ' ' || message.text[0] == '\t');
         if (isDetail && !diags.empty()) {
             addLibraryMessage(diags, message.severity, message.text, "", 0);
             continue;
         }
+        const PropLine* prop = nullptr;
         if (!message.context.empty()) {
             int chosen = -1;
             if (message.context == previousContext && previousLine >= 0 &&
                 textsOnLine[previousLine].count(message.text) == 0) {
                 chosen = previousLine;
-            } else {
-                PropKind kind = startsWith(message.context, "Processing TIMEGRP") ? PropKind::Group
-                                                                                  : PropKind::Spec;
+            } else if (auto found = linesOf.find(message.context); found != linesOf.end()) {
+                const std::vector<int>& candidates = found->second;
+                PropKind kind = props[static_cast<std::size_t>(candidates.front())].kind;
                 int after = cursor.count(kind) != 0 ? cursor[kind] : -1;
-                int firstMatch = -1;
-                for (int i = 0; i < static_cast<int>(props.size()); ++i) {
-                    if (props[i].kind != kind || contexts[i] != message.context)
-                        continue;
-                    if (firstMatch < 0)
-                        firstMatch = i;
-                    if (i > after) {
-                        chosen = i;
-                        break;
-                    }
-                }
-                if (chosen < 0)
-                    chosen = previousContext == message.context ? previousLine : firstMatch;
-                if (chosen >= 0)
-                    cursor[kind] = std::max(after, chosen);
+                auto next = std::upper_bound(candidates.begin(), candidates.end(), after);
+                if (next != candidates.end())
+                    chosen = *next;
+                else
+                    chosen = previousContext == message.context ? previousLine : candidates.front();
+                cursor[kind] = std::max(after, chosen);
             }
             previousContext = message.context;
             previousLine = chosen;
@@ -248,7 +266,7 @@ std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& prop
         } else {
             previousContext.clear();
             previousLine = -1;
-            prop = lineForQuotedName(props, message.text);
+            prop = lineForQuotedName(names, message.text);
         }
         if (prop != nullptr)
             addLibraryMessage(diags, message.severity, message.text, prop->file, prop->line);

@@ -109,7 +109,8 @@ void Session::load(std::vector<InputFile> inputs) {
     m_displayFile = inputs.size() == 1 ? inputs.front().displayName : std::string();
     for (const InputFile& input : inputs) {
         m_fileNames.push_back(input.displayName);
-        std::size_t start = 0;
+        // A byte-order mark is not part of the first line.
+        std::size_t start = input.text.rfind("\xEF\xBB\xBF", 0) == 0 ? 3 : 0;
         int lineNo = 0;
         while (start < input.text.size()) {
             std::size_t end = input.text.find('\n', start);
