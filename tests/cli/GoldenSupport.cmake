@@ -1,0 +1,61 @@
+# Helpers of the golden-test drivers.
+
+# Runs the tool with a clean environment for the library's switches and sets
+# `var` to a transcript: the exit status, then standard output and error
+# output, each as a section.
+function(tsd_golden_run var)
+  cmake_parse_arguments(R "" "TOOL;STDIN;DIR;OUTDIR;NAME" "ARGS" ${ARGN})
+  unset(ENV{TSD_DEBUG_TRACE})
+  unset(ENV{QOR_TSD_NO_SPECIAL_PARSER})
+  unset(ENV{QOR_TSD_DEBUG_SPECIAL_PARSER})
+  set(input /dev/null)
+  if(R_STDIN)
+    set(input ${R_STDIN})
+  endif()
+  execute_process(COMMAND ${R_TOOL} ${R_ARGS}
+                  WORKING_DIRECTORY ${R_DIR}
+                  INPUT_FILE ${input}
+                  OUTPUT_FILE ${R_OUTDIR}/${R_NAME}.stdout
+                  ERROR_FILE ${R_OUTDIR}/${R_NAME}.stderr
+                  RESULT_VARIABLE status)
+  file(READ ${R_OUTDIR}/${R_NAME}.stdout out)
+  file(READ ${R_OUTDIR}/${R_NAME}.stderr err)
+  set(text "status ${status}\n")
+  tsd_golden_section(text "stdout" "${out}")
+  tsd_golden_section(text "stderr" "${err}")
+  set(${var} "${text}" PARENT_SCOPE)
+endfunction()
+
+# Appends a titled section to the transcript in `var`; a body without a final
+# end-of-line is marked, so that one cannot pass for the other.
+function(tsd_golden_section var title body)
+  set(text "${${var}}--- ${title}\n${body}")
+  if(NOT body STREQUAL "" AND NOT body MATCHES "\n$")
+    string(APPEND text "\n--- (no end-of-line above)\n")
+  endif()
+  set(${var} "${text}" PARENT_SCOPE)
+endfunction()
+
+# Compares a transcript with the expectation file (or rewrites it when
+# TSD_UPDATE_GOLDEN is set); on a difference shows it and fails.
+function(tsd_golden_compare actual expected scratch)
+  if(DEFINED ENV{TSD_UPDATE_GOLDEN})
+    file(WRITE ${expected} "${actual}")
+    return()
+  endif()
+  if(NOT EXISTS ${expected})
+    file(WRITE ${scratch} "${actual}")
+    message(FATAL_ERROR "no expectation file ${expected}; the tool gave:\n${actual}")
+  endif()
+  file(READ ${expected} wanted)
+  if(wanted STREQUAL actual)
+    return()
+  endif()
+  file(WRITE ${scratch} "${actual}")
+  find_program(DIFF diff)
+  if(DIFF)
+    execute_process(COMMAND ${DIFF} -u ${expected} ${scratch} OUTPUT_VARIABLE difference)
+    message(FATAL_ERROR "the output differs from ${expected}:\n${difference}")
+  endif()
+  message(FATAL_ERROR "the output differs from ${expected}:\n--- wanted\n${wanted}--- got\n${actual}")
+endfunction()

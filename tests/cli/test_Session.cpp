@@ -1,0 +1,165 @@
+// A session end to end in the process: reading, handing over, building,
+// withdrawing references, and what a fatal library message leaves behind.
+#include "Session.h"
+
+#include <gtest/gtest.h>
+
+#include <iostream>
+#include <string>
+#include <vector>
+
+using tsd_cli::Diagnostic;
+using tsd_cli::InputFile;
+using tsd_cli::Session;
+using tsd_cli::Severity;
+
+namespace {
+
+InputFile text(const std::string& name, const std::string& body) {
+    InputFile input;
+    input.path = name;
+    input.displayName = name;
+    input.text = body;
+    return input;
+}
+
+std::vector<std::string> where(const Session& session) {
+    std::vector<std::string> out;
+    for (const Diagnostic& d : session.diagnostics())
+        out.push_back(d.file + ":" + std::to_string(d.line) + ": " + d.text);
+    return out;
+}
+
+using Lines = std::vector<std::string>;
+
+const char* kSmallDesign = "ref ff1 TS_TNM = regs\n"
+                           "ref ff2 TS_TNM = regs\n"
+                           "ref pad TS_TNM = pads\n"
+                           "ref ram_we TS_TIG = TS02\n"
+                           "group all = regs pads\n"
+                           "spec TS01 = PERIOD all 10 ns\n"
+                           "spec TS02 = FROM pads TO regs TS01 / 2\n";
+
+} // namespace
+
+TEST(Session, BuildsAndKeepsOneRecordPerRefLine) {
+    Session session;
+    session.load({text("a.props", kSmallDesign)});
+    ASSERT_TRUE(session.build()) << testing::PrintToString(where(session));
+    EXPECT_EQ(session.countOf(tsd_cli::PropKind::Ref), 4);
+    ASSERT_EQ(session.refs().size(), 4u);
+    for (const tsd_cli::RefRecord& record : session.refs())
+        EXPECT_NE(record.ref, nullptr);
+    EXPECT_EQ(session.refs()[1].ref->element(), "ff2");
+    // Two records of one TNM group stand for different elements.
+    EXPECT_FALSE(session.refs()[0].ref->isEqual(session.refs()[1].ref));
+    tsd_cli::CliRef same("ff1");
+    EXPECT_TRUE(session.refs()[0].ref->isEqual(&same));
+}
+
+TEST(Session, WithdrawTakesEveryRecordOfTheElementOnce) {
+    Session session;
+    session.load({text("a.props", std::string(kSmallDesign) + "ref ff1 TS_TNM = more\n")});
+    ASSERT_TRUE(session.build());
+    EXPECT_EQ(session.withdraw("ff1"), 2);
+    EXPECT_EQ(session.withdraw("ff1"), 0);
+    EXPECT_EQ(session.withdraw("nothing"), 0);
+    EXPECT_EQ(session.refs()[0].ref, nullptr);
+    EXPECT_NE(session.refs()[1].ref, nullptr);
+
+    std::vector<std::string> trashed;
+    session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason) {
+        trashed.push_back(obj->getGroup() != nullptr ? obj->getGroup()->getName() : "?");
+    };
+    EXPECT_TRUE(session.design().trim());
+    EXPECT_EQ(trashed, Lines{"more"});
+}
+
+TEST(Session, MessagesGoToTheirLinesInFileOrder) {
+    Session session;
+    session.load({text("a.props", "group g = regs nowhere\n"
+                                  "spec TS01 = FROM regs TO nope 1 ns\n"
+                                  "spec TS02 = DROP_SPEC\n"
+                                  "ref x TS_PERIOD = 10 furlongs\n"
+                                  "ref y TS_TNM = regs\n"
+                                  "spec PERIOD = x\n"
+                                  "ref z TS_BOGUS = x\n"
+                                  "junk\n"),
+                  text("b.props", "ref q TS_TPSYNC = regs\n")});
+    EXPECT_FALSE(session.build());
+    EXPECT_EQ(where(session),
+              (Lines{
+                  "a.props:1: A group named \"nowhere\" was referenced in one or more TIMEGRP "
+                  "definitions, but was never defined by a TIMEGRP or TNM property.",
+                  "a.props:2: Processing TIMESPEC definition \"TS01=FROM regs TO nope 1 ns\": No "
+                  "TNM, TPSYNC or user group named \"nope\" is defined.",
+                  "a.props:3: DROP_SPEC is not supported in property files: leave out the "
+                  "definition of \"TS02\" instead",
+                  "a.props:4: Encountered bad token \"furlongs\" in specification.",
+                  "a.props:6: \"PERIOD\" is not a specification name: use a TSid (TS...), OFFSET, "
+                  "ENABLE, DISABLE or TIMEGRP...",
+                  "a.props:7: \"TS_BOGUS\" is not a reference property: use TS_TNM, TS_TPTHRU, "
+                  "TS_TPSYNC, TS_TIG, TS_CLKGRP, TS_OFFSET, TS_PERIOD, TS_MAXDELAY, TS_MAXSKEW or "
+                  "TS_FEEDBACK",
+                  "a.props:8: unknown keyword \"junk\" at the start of the line (expected group, "
+                  "spec or ref)",
+                  "b.props:1: The identifier \"regs\" is used for both a TPSYNC group and a TNM "
+                  "group. Group identifiers must be unique.",
+              }));
+    EXPECT_EQ(session.errorCount(), 8);
+    EXPECT_EQ(session.displayFile(), "");
+    EXPECT_EQ(session.fileNames(), (Lines{"a.props", "b.props"}));
+    // The refused records were never owned; the session freed them.
+    EXPECT_EQ(session.refs().size(), 3u);
+    EXPECT_EQ(session.refs()[0].ref, nullptr);
+    EXPECT_NE(session.refs()[1].ref, nullptr);
+}
+
+TEST(Session, AFailedBuildLeavesTheDesignToTheSession) {
+    Session session;
+    session.load({text("a.props", "ref ff1 TS_TNM = regs\ngroup g = regs missing\n")});
+    EXPECT_FALSE(session.build());
+    EXPECT_FALSE(session.built());
+    // The design and its records are still there to look at.
+    EXPECT_NE(session.design().findGroupByUserName("regs", false), nullptr);
+    EXPECT_EQ(session.refs()[0].ref->getOwner(),
+              session.design().findGroupByUserName("regs", false));
+}
+
+TEST(Session, UnreadableInputsAreIoErrors) {
+    EXPECT_THROW(tsd_cli::readInput("/nonexistent/x.props"), tsd_cli::IoError);
+    EXPECT_THROW(tsd_cli::readInput("/"), tsd_cli::IoError);
+    Session session;
+    EXPECT_THROW(session.load(std::vector<std::string>{"/nonexistent/x.props"}), tsd_cli::IoError);
+    EXPECT_TRUE(session.props().empty());
+}
+
+using SessionDeathTest = testing::Test;
+
+TEST(SessionDeathTest, AFatalMessageIsPrintedAtItsLineAndEndsTheRunWithItsCode) {
+    EXPECT_EXIT(
+        {
+            Session session;
+            session.load({text("a.props", "group g = regs\n")});
+            session.build();
+            // A library misuse that only a program can make: the message goes
+            // through the session's sink, then the library ends the process.
+            Tsd_Annotator annotator(nullptr);
+        },
+        testing::ExitedWithCode(2),
+        "a.props:1: error: A group named \"regs\".*\n"
+        "a.props: fatal error: NULL design in Tsd_Annotator.");
+}
+
+TEST(SessionDeathTest, TheFatalHandlerRunsBeforeTheEnd) {
+    EXPECT_EXIT(
+        {
+            Session session;
+            session.setFatalHandler([&session] {
+                std::cerr << "handler saw " << session.diagnostics().size() << " diagnostic(s)\n";
+            });
+            session.load({text("a.props", "group g = a\n")});
+            Tsd_Annotator annotator(nullptr);
+        },
+        testing::ExitedWithCode(2), "handler saw 1 diagnostic\\(s\\)");
+}

@@ -1,0 +1,57 @@
+// What the tool tells about the input: the library's messages and its own,
+// each tied to the property line it belongs to where that can be known.
+#pragma once
+
+#include "PropFile.h"
+
+#include "tsd/host/Messages.h"
+
+#include <iosfwd>
+#include <string>
+#include <vector>
+
+namespace tsd_cli {
+
+enum class Severity { Error, Warning, Note, Fatal, InternalError };
+
+const char* severityName(Severity severity);
+// Errors, fatal errors and internal errors make a command fail.
+bool isFailure(Severity severity);
+
+struct Diagnostic {
+    std::string file; // empty: not tied to a file
+    int line = 0;     // 0: not tied to a line
+    Severity severity = Severity::Error;
+    std::string text;                 // without the final end-of-line
+    std::vector<std::string> details; // status lines that follow, each without end-of-line
+};
+
+// A library message as the sink received it, with the builder's context at
+// that moment (empty outside the processing of a stored property).
+struct RawMessage {
+    MessageSeverity severity = MessageSeverity::Error;
+    std::string text;
+    std::string context;
+};
+
+// Adds a library message to `diags`: a status line that begins with a blank
+// is a detail line of the previous diagnostic; anything else starts a new one.
+void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
+                       const std::string& text, const std::string& file, int line);
+
+// The context under which the builder processes a stored group or spec line.
+std::string processingContext(const PropLine& prop);
+
+// Ties the messages of a build to the lines of `props` (in the order they were
+// handed to the builder): messages issued while a stored property was
+// processed go to the line with that context; the others go to the line
+// that defines or names what they quote, when it can be found. Messages tied
+// to no line name `fallbackFile` (which may be empty).
+std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& props,
+                                               const std::vector<RawMessage>& messages,
+                                               const std::string& fallbackFile);
+
+// "FILE:LINE: error: text", continuation lines and detail lines indented.
+void printDiagnostic(std::ostream& out, const Diagnostic& diag);
+
+} // namespace tsd_cli
