@@ -39,9 +39,24 @@ bool oneOf(const char* name, const char* const (&names)[N]) {
     return false;
 }
 
-// The caret line under an echoed "name=value": `spaces` blanks and "^".
-std::string caretLine(int spaces) {
-    return std::string(static_cast<size_t>(spaces), ' ') + "^";
+// A defined name as the parser must see it: quoted when it holds a blank, a
+// separator or a quote of the other kind, so that it reads back as one name.
+std::string nameForText(const char* name, bool& quoted) {
+    const std::string text = name;
+    quoted = text.find_first_of(" \t\n\r\v\f:=;'\"") != std::string::npos;
+    if (!quoted)
+        return text;
+    const char quote = text.find('"') == std::string::npos ? '"' : '\'';
+    return quote + text + quote;
+}
+
+// The caret line under an echoed "name=value" for a bad token at text column
+// `column`, where the name starts at column `prefix` (quoted or not).
+std::string caretLine(int column, int prefix, const char* name, bool quoted) {
+    int spaces = column - prefix;
+    if (quoted)
+        spaces -= column > prefix + static_cast<int>(std::strlen(name)) ? 2 : 1;
+    return std::string(static_cast<size_t>(spaces > 0 ? spaces : 0), ' ') + "^";
 }
 
 // Whether a TS property's value holds the OFFSET keyword, standing after a
@@ -279,7 +294,8 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
 
 bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value) {
     const char* name = orEmpty(group->getName());
-    std::string text = std::string("TIMEGRP ") + name + "=" + value + " ;";
+    bool quoted = false;
+    std::string text = "TIMEGRP " + nameForText(name, quoted) + "=" + value + " ;";
     m_specGroupParser->setNewGroup(group);
     m_specGroupParser->clearError();
     if (m_specGroupParser->parse(text.c_str())) {
@@ -288,7 +304,7 @@ bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value)
         const char* token = m_specGroupParser->getBadToken();
         if (offset >= prefix && token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP:\n%s=%s\n%s\n", getContext(),
-                            token, name, value, caretLine(offset - prefix).c_str());
+                            token, name, value, caretLine(offset, prefix, name, quoted).c_str());
         else if (token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP.\n", getContext(), token);
         else
@@ -344,6 +360,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
     // Columns of the echoed "name=value" line start `shift` characters
     // before the parsed text's.
     int shift = 0;
+    bool quoted = false;
     if (equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
         equalsNoCase(name, "DISABLE")) {
         text = std::string(name) + "=" + value + " ;";
@@ -353,7 +370,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         prefix = 1;
         shift = static_cast<int>(std::strlen(name)) + 1;
     } else {
-        text = std::string("TIMESPEC ") + name + "=" + value + " ;";
+        text = "TIMESPEC " + nameForText(name, quoted) + "=" + value + " ;";
         prefix = 10;
     }
     m_specGroupParser->clearError();
@@ -372,7 +389,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         if (offset >= prefix && token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC:\n%s=%s\n%s\n",
                             getContext(), token, name, value,
-                            caretLine(offset - prefix + shift).c_str());
+                            caretLine(offset + shift, prefix, name, quoted).c_str());
         else if (token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC.\n", getContext(), token);
         else

@@ -417,3 +417,31 @@ TEST(BuilderBuild, AnObjectOfAnotherClassInTheTIGListIsFatal) {
     DesignBuilder builder(&design);
     EXPECT_EQ(fatalText([&] { builder.buildTSDesign(); }), "Non-TIG group in list.\n");
 }
+
+TEST(BuilderBuild, NamesThatNeedQuotesCanBeDefined) {
+    // A TNM property can make a group whose name holds a blank; a TIMEGRP
+    // or TIMESPEC of such a name must read back as one name.
+    MessageCapture capture;
+    PropSet set;
+    set.refs = {{"e", "TS_TNM", "two words"}};
+    set.groups = {{"a b", "\"two words\""}, {"it's", "\"a b\""}};
+    set.specs = {{"TS 1", "PERIOD:\"a b\":1:nS"}};
+    Built built = build(set);
+    ASSERT_NE(built.design, nullptr) << capture.sink.transcript();
+    EXPECT_NE(built.design->findGroupByUserName("a b", false)->getUserGroup(), nullptr);
+    EXPECT_NE(built.design->findEndpointSpecByTSid("TS 1", false), nullptr);
+
+    // The caret still stands under the bad token of the echoed definition.
+    MessageCapture errors;
+    Tsd_Builder builder;
+    builder.addUserGroupProp("x y", "a::b");
+    builder.addSpecProp("TS 2", "BOGUS:a");
+    EXPECT_EQ(builder.buildTSDesign(), nullptr);
+    EXPECT_EQ(
+        errors.sink.errors(),
+        (std::vector<std::string>{
+            "Processing TIMEGRP definition \"x y=a::b\": Encountered bad token \":\" in "
+            "TIMEGRP:\nx y=a::b\n      ^\n",
+            "Processing TIMESPEC definition \"TS 2=BOGUS:a\": Encountered bad token \"BOGUS\" "
+            "in TIMESPEC:\nTS 2=BOGUS:a\n     ^\n"}));
+}
