@@ -220,6 +220,28 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
     return errors == 0 ? kExitOk : kExitErrors;
 }
 
+namespace {
+
+// The canonical properties as three JSON lists, by kind.
+struct PropLists {
+    json groups = json::array();
+    json specs = json::array();
+    json refs = json::array();
+};
+
+PropLists propLists(const std::vector<OutProp>& props) {
+    PropLists lists;
+    for (const OutProp& prop : props) {
+        json& list = prop.kind == PropKind::Group  ? lists.groups
+                     : prop.kind == PropKind::Spec ? lists.specs
+                                                   : lists.refs;
+        list.push_back(propJson(prop));
+    }
+    return lists;
+}
+
+} // namespace
+
 int runFmt(const std::string& file, const OutputOptions& options) {
     Session session;
     if (!loadAndBuild(
@@ -228,18 +250,10 @@ int runFmt(const std::string& file, const OutputOptions& options) {
         return kExitErrors;
     std::vector<OutProp> props = canonicalProps(session);
     if (options.json) {
-        json groups = json::array();
-        json specs = json::array();
-        json refs = json::array();
-        for (const OutProp& prop : props) {
-            json& list = prop.kind == PropKind::Group  ? groups
-                         : prop.kind == PropKind::Spec ? specs
-                                                       : refs;
-            list.push_back(propJson(prop));
-        }
-        emit(options, dumpJson({{"groups", groups},
-                                {"specs", specs},
-                                {"refs", refs},
+        PropLists lists = propLists(props);
+        emit(options, dumpJson({{"groups", lists.groups},
+                                {"specs", lists.specs},
+                                {"refs", lists.refs},
                                 {"diagnostics", diagnosticsJson(session)}}));
     } else {
         emit(options, propsText(props));
@@ -339,20 +353,12 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
 
     std::vector<OutProp> props = canonicalProps(session);
     if (options.json) {
-        json groups = json::array();
-        json specs = json::array();
-        json refs = json::array();
-        for (const OutProp& prop : props) {
-            json& list = prop.kind == PropKind::Group  ? groups
-                         : prop.kind == PropKind::Spec ? specs
-                                                       : refs;
-            list.push_back(propJson(prop));
-        }
+        PropLists lists = propLists(props);
         emit(options, dumpJson({{"withdrawn", withdrawn},
                                 {"trashed", trashed},
-                                {"groups", groups},
-                                {"specs", specs},
-                                {"refs", refs},
+                                {"groups", lists.groups},
+                                {"specs", lists.specs},
+                                {"refs", lists.refs},
                                 {"diagnostics", diagnosticsJson(session)}}));
     } else {
         emit(options, trashedText + propsText(props));
