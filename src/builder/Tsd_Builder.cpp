@@ -220,42 +220,42 @@ Tsd_Group* Tsd_Builder::getSimpleGroup(const char* name, const char* value) {
         d.addClockGroup(clock);
         return clock;
     }
-    const char* what = nullptr;
-    if (equalsNoCase(name, "TS_TNM"))
-        what = "a TNM group";
-    else if (equalsNoCase(name, "TS_TPTHRU"))
-        what = "a TPTHRU group";
-    else if (equalsNoCase(name, "TS_TPSYNC"))
-        what = "a TPSYNC group";
-    else
-        return nullptr;
-
-    Tsd_Group* found = d.findGroupByUserName(value, false);
-    if (found != nullptr) {
-        Tsd_Group* typed = nullptr;
-        if (equalsNoCase(name, "TS_TNM"))
-            typed = found->getTNMGroup();
-        else if (equalsNoCase(name, "TS_TPTHRU"))
-            typed = found->getThruGroup();
-        else
-            typed = found->getSyncGroup();
-        if (typed != nullptr)
+    // The three kinds kept in the group list: the class a found group must
+    // have, how to make one, and the name of the kind for the clash error.
+    struct GroupKind {
+        const char* prop;
+        const char* what;
+        Tsd_Group* (*typed)(Tsd_Group*);
+        Tsd_Group* (*make)(const char*);
+    };
+    static const GroupKind kinds[] = {
+        {"TS_TNM", "a TNM group", [](Tsd_Group* g) -> Tsd_Group* { return g->getTNMGroup(); },
+         [](const char* n) -> Tsd_Group* { return new Tsd_TNMGroup(n); }},
+        {"TS_TPTHRU", "a TPTHRU group",
+         [](Tsd_Group* g) -> Tsd_Group* { return g->getThruGroup(); },
+         [](const char* n) -> Tsd_Group* { return new Tsd_ThruGroup(n); }},
+        {"TS_TPSYNC", "a TPSYNC group",
+         [](Tsd_Group* g) -> Tsd_Group* { return g->getSyncGroup(); },
+         [](const char* n) -> Tsd_Group* { return new Tsd_SyncGroup(n); }},
+    };
+    for (const GroupKind& kind : kinds) {
+        if (!equalsNoCase(name, kind.prop))
+            continue;
+        Tsd_Group* found = d.findGroupByUserName(value, false);
+        if (found == nullptr) {
+            Tsd_Group* created = kind.make(value);
+            d.addGroup(created);
+            return created;
+        }
+        if (Tsd_Group* typed = kind.typed(found))
             return typed;
-        std::string format = std::string("The identifier \"%s\" is used for both ") + what +
+        std::string format = std::string("The identifier \"%s\" is used for both ") + kind.what +
                              " and %z. Group identifiers must be unique.\n";
         TSD_MSG().error(format.c_str(), value, getObjUserId(found));
         countError();
         return nullptr;
     }
-    Tsd_Group* created = nullptr;
-    if (equalsNoCase(name, "TS_TNM"))
-        created = new Tsd_TNMGroup(value);
-    else if (equalsNoCase(name, "TS_TPTHRU"))
-        created = new Tsd_ThruGroup(value);
-    else
-        created = new Tsd_SyncGroup(value);
-    d.addGroup(created);
-    return created;
+    return nullptr;
 }
 
 Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value) {

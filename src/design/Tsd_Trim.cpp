@@ -278,7 +278,7 @@ void Tsd_Design::getGroupHolders(Tsd_Group* group, Tsd_BaseObjList* list) {
         }
     }
 
-    // A TIG group is held by the spec whose TSid it names.
+    // A TIG group is held by the delay path or period whose TSid it names.
     if (term == nullptr && clock == nullptr) {
         Tsd_TIGGroup* tig = group->getTIGGroup();
         const char* tsid = tig != nullptr ? tig->getTIGid() : nullptr;

@@ -112,4 +112,12 @@ void dumpDutyCycle(DumpStream& stream, short indent, const Tsd_TimeValue* dutyVa
         dumpLine(stream, indent, "   percent duty cycle unset");
 }
 
+Tsd_TimeValue percentOfPeriod(double percent, const Tsd_TimeValue& period) {
+    // A duty cycle is a time even when the period is a frequency.
+    if (Tsd_TimeValue::isFrequency(period.units))
+        return Tsd_TimeValue(percent / 100.0 * period.getValue(Tsd_TimeValue::UNITS_NS),
+                             Tsd_TimeValue::UNITS_NS);
+    return Tsd_TimeValue(percent / 100.0 * period.value, period.units);
+}
+
 } // namespace tsd_detail

@@ -44,6 +44,10 @@ std::string propTime(const Tsd_TimeValue& value);
 void appendDutyAndJitter(std::string& text, const Tsd_TimeValue* dutyValue, double dutyPercent,
                          bool high, const Tsd_TimeValue* inputJitter);
 
+// `percent` of `period` as a time: in the period's unit, or in nS when the
+// period is a frequency.
+Tsd_TimeValue percentOfPeriod(double percent, const Tsd_TimeValue& period);
+
 // The two duty-cycle lines of a period's dump: absolute, then percent.
 void dumpDutyCycle(DumpStream& stream, short indent, const Tsd_TimeValue* dutyValue,
                    double dutyPercent, bool high);

@@ -63,12 +63,7 @@ Tsd_TimeValue Tsd_NetTiming::getDutyCycleValue() const {
         return *m_dutyCycleValue;
     if (m_period == nullptr)
         TSD_MSG().fatal(2, "No duty cycle without period.\n");
-    // A duty cycle is a time even when the period is a frequency.
-    if (Tsd_TimeValue::isFrequency(m_period->units))
-        return Tsd_TimeValue(m_dutyCyclePercent / 100.0 *
-                                 m_period->getValue(Tsd_TimeValue::UNITS_NS),
-                             Tsd_TimeValue::UNITS_NS);
-    return Tsd_TimeValue(m_dutyCyclePercent / 100.0 * m_period->value, m_period->units);
+    return tsd_detail::percentOfPeriod(m_dutyCyclePercent, *m_period);
 }
 
 void Tsd_NetTiming::setPeriodValue(const Tsd_TimeValue& value) {

@@ -37,12 +37,7 @@ Tsd_TimeValue Tsd_Period::getDutyCycleValue() const {
         return *m_dutyCycleValue;
     if (checkLink(false) != 0)
         TSD_MSG().fatal(2, "Bad link on %s getting duty cycle.\n", getTSid());
-    Tsd_TimeValue period = getDelayValue();
-    // A duty cycle is a time even when the period is a frequency.
-    if (Tsd_TimeValue::isFrequency(period.units))
-        return Tsd_TimeValue(m_dutyCyclePercent / 100.0 * period.getValue(Tsd_TimeValue::UNITS_NS),
-                             Tsd_TimeValue::UNITS_NS);
-    return Tsd_TimeValue(m_dutyCyclePercent / 100.0 * period.value, period.units);
+    return tsd_detail::percentOfPeriod(m_dutyCyclePercent, getDelayValue());
 }
 
 void Tsd_Period::setDutyCycleValue(const Tsd_TimeValue& value, bool high) {
