@@ -1,6 +1,7 @@
 #include "PropFile.h"
 
 #include <cstdio>
+#include <stdexcept>
 
 namespace tsd_cli {
 
@@ -44,29 +45,30 @@ public:
 
     // A name or element after blanks. False with `error` set when it is
     // malformed; `word` is empty (and no error set) when there is none.
-    bool readWord(std::string& word, std::string& error) {
-        word.clear();
+    bool readWord(Word& word, std::string& error) {
+        word = Word();
         skipBlanks();
         if (atEnd() || peek() == '=')
             return true;
         if (peek() != '"') {
-            word = std::string(bareRun());
+            word.text = bareRun();
             if (!atEnd() && peek() == '"') {
-                error = "unexpected '\"' in the name " + inQuotes(word);
+                error = "unexpected '\"' in the name " + inQuotes(word.text);
                 return false;
             }
             return true;
         }
         advance(); // the opening quote
+        std::size_t start = m_pos;
         for (;;) {
             if (atEnd()) {
                 error = "unterminated quoted name";
                 return false;
             }
             char c = peek();
-            advance();
             if (c == '"')
                 break;
+            advance();
             if (c == '\\') {
                 if (atEnd()) {
                     error = "unterminated quoted name";
@@ -79,17 +81,17 @@ public:
                     return false;
                 }
                 advance();
-                word += escaped;
-                continue;
+                word.escaped = true;
             }
-            word += c;
         }
-        if (word.empty()) {
+        word.text = m_text.substr(start, m_pos - start);
+        advance(); // the closing quote
+        if (word.text.empty()) {
             error = "empty quoted name";
             return false;
         }
         if (!atEnd() && !isBlank(peek()) && peek() != '=') {
-            error = "expected a blank or \"=\" after the quoted name " + inQuotes(word);
+            error = "expected a blank or \"=\" after the quoted name " + inQuotes(word.str());
             return false;
         }
         return true;
@@ -122,7 +124,20 @@ const char* propKeyword(PropKind kind) {
     return "?";
 }
 
-LineStatus parsePropLine(std::string_view text, PropLine& prop, std::string& error) {
+std::string Word::str() const {
+    if (!escaped)
+        return std::string(text);
+    std::string word;
+    word.reserve(text.size());
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (text[i] == '\\' && i + 1 < text.size())
+            ++i;
+        word += text[i];
+    }
+    return word;
+}
+
+LineStatus parsePropLine(std::string_view text, PropFields& prop, std::string& error) {
     if (!text.empty() && text.back() == '\r')
         text.remove_suffix(1);
     for (std::size_t i = 0; i < text.size(); ++i) {
@@ -141,12 +156,12 @@ LineStatus parsePropLine(std::string_view text, PropLine& prop, std::string& err
         return LineStatus::Blank;
 
     std::string_view keyword = reader.bareRun();
-    if (keyword == "group") {
+    if (keyword == "ref") {
+        prop.kind = PropKind::Ref;
+    } else if (keyword == "group") {
         prop.kind = PropKind::Group;
     } else if (keyword == "spec") {
         prop.kind = PropKind::Spec;
-    } else if (keyword == "ref") {
-        prop.kind = PropKind::Ref;
     } else {
         if (keyword.empty())
             error = "expected group, spec or ref at the start of the line";
@@ -156,75 +171,134 @@ LineStatus parsePropLine(std::string_view text, PropLine& prop, std::string& err
         return LineStatus::Malformed;
     }
 
-    prop.element.clear();
+    prop.element = Word();
     if (prop.kind == PropKind::Ref) {
         if (!reader.readWord(prop.element, error))
             return LineStatus::Malformed;
-        if (prop.element.empty()) {
+        if (prop.element.text.empty()) {
             error = "missing element after \"ref\"";
             return LineStatus::Malformed;
         }
     }
     if (!reader.readWord(prop.name, error))
         return LineStatus::Malformed;
-    if (prop.name.empty()) {
+    if (prop.name.text.empty()) {
         error = prop.kind == PropKind::Ref
-                    ? "missing property name after the element " + inQuotes(prop.element)
+                    ? "missing property name after the element " + inQuotes(prop.element.str())
                     : std::string("missing name after \"") + propKeyword(prop.kind) + "\"";
         return LineStatus::Malformed;
     }
 
     reader.skipBlanks();
     if (reader.atEnd() || reader.peek() != '=') {
-        error = "missing \"=\" after " + inQuotes(prop.name);
+        error = "missing \"=\" after " + inQuotes(prop.name.str());
         if (!reader.atEnd()) {
-            std::string found;
+            Word found;
             std::string ignored;
-            if (reader.readWord(found, ignored) && !found.empty())
-                error += " (found " + inQuotes(found) + ")";
+            if (reader.readWord(found, ignored) && !found.text.empty())
+                error += " (found " + inQuotes(found.str()) + ")";
         }
         return LineStatus::Malformed;
     }
     reader.advance();
-    prop.value = std::string(trimBlanks(reader.rest()));
+    prop.value = trimBlanks(reader.rest());
     return LineStatus::Property;
 }
 
-std::string inQuotes(std::string_view text) {
-    return "\"" + std::string(text) + "\"";
+std::uint32_t PropStore::addFile(std::string displayName, std::string text) {
+    m_files.push_back({std::move(displayName), std::move(text)});
+    return static_cast<std::uint32_t>(m_files.size() - 1);
 }
 
-std::string quoteWord(std::string_view word) {
-    bool bare = !word.empty();
-    for (char c : word)
-        if (endsBareWord(c))
-            bare = false;
-    if (bare)
-        return std::string(word);
-    std::string quoted = "\"";
-    for (char c : word) {
-        if (c == '"' || c == '\\')
-            quoted += '\\';
-        quoted += c;
-    }
+TextSpan PropStore::spanIn(std::uint32_t file, std::string_view part) const {
+    std::string_view text = fileText(file);
+    return {static_cast<std::uint32_t>(part.data() - text.data()),
+            static_cast<std::uint32_t>(part.size())};
+}
+
+TextSpan PropStore::keep(std::string_view text) {
+    if (text.size() > kMaxText - m_arena.size())
+        throw std::length_error("more than 4 GiB of property text");
+    TextSpan span{static_cast<std::uint32_t>(m_arena.size()),
+                  static_cast<std::uint32_t>(text.size())};
+    m_arena.append(text);
+    return span;
+}
+
+std::size_t PropStore::add(const PropRecord& record) {
+    m_records.push_back(record);
+    return m_records.size() - 1;
+}
+
+std::size_t PropStore::add(PropKind kind, std::uint32_t file, std::uint32_t line,
+                           std::string_view element, std::string_view name,
+                           std::string_view value) {
+    PropRecord record;
+    record.kind = kind;
+    record.file = file;
+    record.line = line;
+    record.element = keep(element);
+    record.name = keep(name);
+    record.value = keep(value);
+    record.inArena = PropRecord::Element | PropRecord::Name | PropRecord::Value;
+    return add(record);
+}
+
+std::string inQuotes(std::string_view text) {
+    std::string quoted;
+    quoted.reserve(text.size() + 2);
+    quoted += '"';
+    quoted += text;
     quoted += '"';
     return quoted;
 }
 
+void appendQuotedWord(std::string& out, std::string_view word) {
+    bool bare = !word.empty();
+    for (char c : word)
+        if (endsBareWord(c))
+            bare = false;
+    if (bare) {
+        out += word;
+        return;
+    }
+    out += '"';
+    for (char c : word) {
+        if (c == '"' || c == '\\')
+            out += '\\';
+        out += c;
+    }
+    out += '"';
+}
+
+std::string quoteWord(std::string_view word) {
+    std::string quoted;
+    appendQuotedWord(quoted, word);
+    return quoted;
+}
+
+void appendPropLine(std::string& out, PropKind kind, std::string_view element,
+                    std::string_view name, std::string_view value) {
+    out += propKeyword(kind);
+    if (kind == PropKind::Ref) {
+        out += ' ';
+        appendQuotedWord(out, element);
+    }
+    out += ' ';
+    appendQuotedWord(out, name);
+    out += " =";
+    if (!value.empty()) {
+        out += ' ';
+        out += value;
+    }
+    out += '\n';
+}
+
 std::string formatPropLine(PropKind kind, std::string_view element, std::string_view name,
                            std::string_view value) {
-    std::string line = propKeyword(kind);
-    if (kind == PropKind::Ref) {
-        line += ' ';
-        line += quoteWord(element);
-    }
-    line += ' ';
-    line += quoteWord(name);
-    line += " =";
-    if (!value.empty()) {
-        line += ' ';
-        line += value;
-    }
+    std::string line;
+    appendPropLine(line, kind, element, name, value);
+    line.pop_back();
     return line;
 }
 
