@@ -4,7 +4,7 @@
 
 #include "tsd/Tsd.h"
 
-#include <map>
+#include <unordered_map>
 #include <ostream>
 #include <string>
 #include <vector>
@@ -175,7 +175,7 @@ private:
 
     std::ostream& m_out;
     Tsd_Design& m_design;
-    std::map<Tsd_BaseObj*, std::string> m_ids;
+    std::unordered_map<Tsd_BaseObj*, std::string> m_ids;
 };
 
 } // namespace

@@ -70,16 +70,32 @@ struct FileCloser {
     void operator()(std::FILE* file) const { std::fclose(file); }
 };
 
+// The live sessions by number; a slot is null once its session is gone.
+std::vector<Session*>& liveSessions() {
+    static std::vector<Session*> sessions;
+    return sessions;
+}
+
 } // namespace
 
+// Two pointers and two indexes: one small heap block per reference line.
+static_assert(sizeof(CliRef) <= 3 * sizeof(void*), "a reference record grew");
+
+CliRef::CliRef(const Session& session, std::size_t record)
+    : m_session(session.m_number), m_record(static_cast<std::uint32_t>(record)) {}
+
 CliRef::~CliRef() {
-    CliRef*& slot = m_session->m_refOf[m_record];
+    CliRef*& slot = session().m_refOf[m_record];
     if (slot == this)
         slot = nullptr;
 }
 
+Session& CliRef::session() const {
+    return *liveSessions()[m_session];
+}
+
 std::string_view CliRef::element() const {
-    const PropStore& store = m_session->store();
+    const PropStore& store = session().store();
     return store.element(store[m_record]);
 }
 
@@ -123,11 +139,23 @@ InputFile readInput(const std::string& path) {
 }
 
 Session::Session() {
+    std::vector<Session*>& live = liveSessions();
+    auto slot = std::find(live.begin(), live.end(), nullptr);
+    if (slot == live.end())
+        slot = live.insert(live.end(), nullptr);
+    *slot = this;
+    m_number = static_cast<std::uint32_t>(slot - live.begin());
     m_design = std::make_unique<CliDesign>();
     m_builder = std::make_unique<CliBuilder>(m_design.get());
 }
 
-Session::~Session() = default;
+Session::~Session() {
+    // The design deletes its reference records, which find the session by
+    // its number: it stays registered until they are gone.
+    m_design.reset();
+    m_builder.reset();
+    liveSessions()[m_number] = nullptr;
+}
 
 void Session::load(const std::vector<std::string>& paths) {
     std::vector<InputFile> inputs;
@@ -334,7 +362,7 @@ std::vector<std::size_t> Session::recordsOwnedBy(Tsd_BaseObj* owner) const {
     Tsd_RefListIter iter(owner);
     while (Tsd_Ref* ref = iter.next()) {
         auto* cli = dynamic_cast<CliRef*>(ref);
-        if (cli != nullptr && cli->m_session == this && m_refOf[cli->record()] == cli)
+        if (cli != nullptr && cli->m_session == m_number && m_refOf[cli->record()] == cli)
             records.push_back(cli->record());
     }
     // A list may hold a record twice; each record stands once, in input order.

@@ -47,8 +47,7 @@ public:
 // deletes it, the session forgets it.
 class CliRef : public Tsd_Ref {
 public:
-    CliRef(Session& session, std::size_t record)
-        : m_session(&session), m_record(static_cast<std::uint32_t>(record)) {}
+    CliRef(const Session& session, std::size_t record);
     ~CliRef() override;
     CliRef(const CliRef&) = delete;
     CliRef& operator=(const CliRef&) = delete;
@@ -61,7 +60,12 @@ public:
 private:
     friend class Session;
 
-    Session* m_session;
+    Session& session() const;
+
+    // A design holds one of these per reference line: the session by its
+    // number and the record by its index keep it as small as the library's
+    // own part.
+    std::uint32_t m_session;
     std::uint32_t m_record;
 };
 
@@ -156,6 +160,7 @@ private:
     void attributeBuildMessages();
 
     ScopedMessageSink m_sinkGuard{this};
+    std::uint32_t m_number = 0; // among the live sessions
     PropStore m_store;
     // Parallel to the records; cleared by a CliRef that dies.
     std::vector<CliRef*> m_refOf;
