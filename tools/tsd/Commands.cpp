@@ -3,6 +3,7 @@
 #include "Describe.h"
 #include "Graph.h"
 #include "Json.h"
+#include "Pages.h"
 #include "Session.h"
 
 #include "tsd/host/DumpStream.h"
@@ -82,14 +83,15 @@ void printDiagnostics(const Session& session) {
     std::cerr.flush();
 }
 
-// Room for a product about as long as the input: pages that stay unused
-// cost nothing, and the text is never copied as it grows.
-std::string outputBuffer(const Session& session) {
+// Room for the product of a command that writes the design back: pages
+// that stay unused cost nothing, and the text is not copied as it grows.
+// JSON takes about four times the room of property lines.
+std::string outputBuffer(const Session& session, const OutputOptions& options) {
     std::size_t input = 0;
     for (std::uint32_t file = 0; file < session.store().fileCount(); ++file)
         input += session.store().fileText(file).size();
     std::string out;
-    out.reserve(input + input / 2 + 4096);
+    reserveLarge(out, (input + input / 2) * (options.json ? 4 : 1) + 4096);
     return out;
 }
 
@@ -263,7 +265,7 @@ int runFmt(const std::string& file, const OutputOptions& options) {
     Session session;
     if (!loadAndBuild(session, {file}, options, writeEmptyLists))
         return kExitErrors;
-    std::string out = outputBuffer(session);
+    std::string out = outputBuffer(session, options);
     if (options.json) {
         JsonWriter json(out);
         json.beginObject();
@@ -389,7 +391,7 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
     session.design().trim();
     session.design().onTrashed = nullptr;
 
-    std::string out = outputBuffer(session);
+    std::string out = outputBuffer(session, options);
     if (options.json) {
         JsonWriter json(out);
         json.beginObject().key("withdrawn").beginArray();

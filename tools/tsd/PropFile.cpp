@@ -1,5 +1,7 @@
 #include "PropFile.h"
 
+#include "Pages.h"
+
 #include <cstdio>
 #include <stdexcept>
 
@@ -223,6 +225,10 @@ TextSpan PropStore::keep(std::string_view text) {
                   static_cast<std::uint32_t>(text.size())};
     m_arena.append(text);
     return span;
+}
+
+void PropStore::reserve(std::size_t records) {
+    reserveLarge(m_records, records);
 }
 
 std::size_t PropStore::add(const PropRecord& record) {

@@ -1,5 +1,7 @@
 #include "Session.h"
 
+#include "Pages.h"
+
 #include "tsd/host/DumpStream.h"
 
 #include <algorithm>
@@ -50,6 +52,7 @@ bool isDropSpec(std::string_view value) {
 // Reads to the end of `in` in large blocks, into one buffer of the
 // expected size: no per-character work, no copy while it grows.
 void readAll(std::FILE* in, std::string& text, std::size_t expected, const std::string& what) {
+    reserveLarge(text, expected + 1);
     text.resize(expected + 1); // one more, so that the end shows without growing
     std::size_t size = 0;
     for (;;) {
@@ -171,7 +174,7 @@ void Session::load(std::vector<InputFile> inputs) {
         lines += static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
     // An upper bound: the pages of lines without a property are never touched.
     m_store.reserve(m_store.size() + lines);
-    m_refOf.reserve(m_refOf.size() + lines);
+    reserveLarge(m_refOf, m_refOf.size() + lines);
     std::vector<std::uint32_t> files;
     for (InputFile& input : inputs)
         files.push_back(addFile(std::move(input)));
@@ -269,12 +272,16 @@ void Session::feed(std::size_t index) {
         return;
     }
     case PropKind::Ref: {
-        if (!Tsd_Builder::isRefProp(m_name.c_str())) {
-            lineError(record, inQuotes(name) +
-                                  " is not a reference property: use TS_TNM, TS_TPTHRU, "
-                                  "TS_TPSYNC, TS_TIG, TS_CLKGRP, TS_OFFSET, TS_PERIOD, "
-                                  "TS_MAXDELAY, TS_MAXSKEW or TS_FEEDBACK");
-            return;
+        // Most lines repeat the name of the line before.
+        if (m_lastRefProp.empty() || m_name != m_lastRefProp) {
+            if (!Tsd_Builder::isRefProp(m_name.c_str())) {
+                lineError(record, inQuotes(name) +
+                                      " is not a reference property: use TS_TNM, TS_TPTHRU, "
+                                      "TS_TPSYNC, TS_TIG, TS_CLKGRP, TS_OFFSET, TS_PERIOD, "
+                                      "TS_MAXDELAY, TS_MAXSKEW or TS_FEEDBACK");
+                return;
+            }
+            m_lastRefProp = m_name;
         }
         auto ref = std::make_unique<CliRef>(*this, index);
         m_currentRecord = static_cast<std::ptrdiff_t>(index);

@@ -174,6 +174,7 @@ private:
     // Reused for the zero-terminated name and value of each hand-over.
     std::string m_name;
     std::string m_value;
+    std::string m_lastRefProp; // the last name taken as a reference property
     bool m_building = false;
     bool m_built = false;
     std::function<void()> m_fatalHandler;
