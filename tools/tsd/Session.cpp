@@ -45,6 +45,11 @@ bool isDropSpec(std::string_view value) {
     return equalsNoCase(value, "DROP_SPEC");
 }
 
+// Records address the text by 32-bit offsets.
+[[noreturn]] void throwTooLarge(const std::string& name) {
+    throw IoError("cannot read \"" + name + "\": the input passes 4 GiB");
+}
+
 [[noreturn]] void throwReadError(const std::string& what) {
     throw IoError("cannot read " + what + ": " + std::strerror(errno));
 }
@@ -81,14 +86,38 @@ std::vector<Session*>& liveSessions() {
 
 } // namespace
 
-// Two pointers and two indexes: one small heap block per reference line.
+// Two pointers and two indexes per reference line.
 static_assert(sizeof(CliRef) <= 3 * sizeof(void*), "a reference record grew");
+static_assert(alignof(CliRef) <= alignof(void*), "the pool aligns to a pointer");
+
+namespace {
+
+BlockPool& refPool() {
+    static BlockPool pool(sizeof(CliRef));
+    return pool;
+}
+
+} // namespace
+
+void* CliRef::operator new(std::size_t size) {
+    return size <= refPool().blockSize() ? refPool().allocate() : ::operator new(size);
+}
+
+void CliRef::operator delete(void* block, std::size_t size) {
+    if (size <= refPool().blockSize())
+        refPool().release(block);
+    else
+        ::operator delete(block);
+}
 
 CliRef::CliRef(const Session& session, std::size_t record)
     : m_session(session.m_number), m_record(static_cast<std::uint32_t>(record)) {}
 
 CliRef::~CliRef() {
-    CliRef*& slot = session().m_refOf[m_record];
+    Session& owner = session();
+    if (owner.m_closing)
+        return; // nobody asks any more
+    CliRef*& slot = owner.m_refOf[m_record];
     if (slot == this)
         slot = nullptr;
 }
@@ -136,7 +165,9 @@ InputFile readInput(const std::string& path) {
     if (!in)
         throw IoError("cannot open \"" + path + "\": " + std::strerror(errno));
     std::uintmax_t size = std::filesystem::file_size(path, ec);
-    std::size_t expected = !ec && size < PropStore::kMaxText ? static_cast<std::size_t>(size) : 0;
+    if (!ec && size > PropStore::kMaxText)
+        throwTooLarge(path);
+    std::size_t expected = !ec ? static_cast<std::size_t>(size) : 0;
     readAll(in.get(), input.text, expected, "\"" + path + "\"");
     return input;
 }
@@ -155,6 +186,7 @@ Session::Session() {
 Session::~Session() {
     // The design deletes its reference records, which find the session by
     // its number: it stays registered until they are gone.
+    m_closing = true;
     m_design.reset();
     m_builder.reset();
     liveSessions()[m_number] = nullptr;
@@ -184,8 +216,7 @@ void Session::load(std::vector<InputFile> inputs) {
 
 std::uint32_t Session::addFile(InputFile input) {
     if (input.text.size() > PropStore::kMaxText - m_textSize)
-        throw IoError("cannot read \"" + input.displayName +
-                      "\": the input files are larger than 4 GiB together");
+        throwTooLarge(input.displayName);
     m_textSize += input.text.size();
     m_fileNames.push_back(input.displayName);
     return m_store.addFile(std::move(input.displayName), std::move(input.text));
@@ -222,7 +253,8 @@ void Session::readPropFile(std::uint32_t file) {
                 record.inArena |= field;
                 return m_store.keep(word.str());
             };
-            record.element = span(fields.element, PropRecord::Element);
+            if (fields.kind == PropKind::Ref)
+                record.element = span(fields.element, PropRecord::Element);
             record.name = span(fields.name, PropRecord::Name);
             record.value = m_store.spanIn(file, fields.value);
             add(record);

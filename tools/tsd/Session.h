@@ -51,6 +51,10 @@ public:
     ~CliRef() override;
     CliRef(const CliRef&) = delete;
     CliRef& operator=(const CliRef&) = delete;
+    // A design holds one per reference line and deletes them all at the
+    // end: they come from a pool.
+    static void* operator new(std::size_t size);
+    static void operator delete(void* block, std::size_t size);
 
     bool isEqual(const Tsd_Ref* other) const override;
     void dump(DumpStream& stream, short indent) const override;
@@ -177,6 +181,7 @@ private:
     std::string m_lastRefProp; // the last name taken as a reference property
     bool m_building = false;
     bool m_built = false;
+    bool m_closing = false; // the design is being destroyed with the session
     std::function<void()> m_fatalHandler;
     // Declared in this order so that the design goes first: after a failed
     // build its user groups may still point at the builder's placeholders.
