@@ -139,35 +139,19 @@ JsonWriter& JsonWriter::key(std::string_view name) {
     return *this;
 }
 
-JsonWriter& JsonWriter::beginObject() {
+JsonWriter& JsonWriter::open(char bracket) {
     beforeValue();
-    m_out += '{';
+    m_out += bracket;
     m_hasChild.push_back(false);
     return *this;
 }
 
-JsonWriter& JsonWriter::endObject() {
+JsonWriter& JsonWriter::close(char bracket) {
     bool hadChild = m_hasChild.back();
     m_hasChild.pop_back();
     if (hadChild)
         newLine();
-    m_out += '}';
-    return *this;
-}
-
-JsonWriter& JsonWriter::beginArray() {
-    beforeValue();
-    m_out += '[';
-    m_hasChild.push_back(false);
-    return *this;
-}
-
-JsonWriter& JsonWriter::endArray() {
-    bool hadChild = m_hasChild.back();
-    m_hasChild.pop_back();
-    if (hadChild)
-        newLine();
-    m_out += ']';
+    m_out += bracket;
     return *this;
 }
 

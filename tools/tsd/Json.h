@@ -22,10 +22,10 @@ public:
     // Inside an object, key() comes before each member's value.
     JsonWriter& key(std::string_view name);
 
-    JsonWriter& beginObject();
-    JsonWriter& endObject();
-    JsonWriter& beginArray();
-    JsonWriter& endArray();
+    JsonWriter& beginObject() { return open('{'); }
+    JsonWriter& endObject() { return close('}'); }
+    JsonWriter& beginArray() { return open('['); }
+    JsonWriter& endArray() { return close(']'); }
     JsonWriter& string(std::string_view text);
     JsonWriter& number(long long value);
     JsonWriter& boolean(bool value);
@@ -48,6 +48,8 @@ private:
     // was just written.
     void beforeValue();
     void newLine();
+    JsonWriter& open(char bracket);
+    JsonWriter& close(char bracket);
 
     std::string& m_out;
     // Per open container: whether it has a child yet.
