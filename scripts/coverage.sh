@@ -20,7 +20,8 @@ ctest --preset coverage
 report=build/coverage/report
 mkdir -p "$report"
 gcovr --root . --object-directory build/coverage \
-      --filter 'src/' --filter 'tools/' --exclude-directories 'build/coverage/CMakeFiles' \
+      --filter 'src/' --filter 'tools/' \
+      --exclude-directories '.*/consumer/.*' --exclude-directories '.*/CMakeFiles/[0-9].*' \
       --exclude-throw-branches --exclude-unreachable-branches \
       --json-summary "$report/summary.json" \
       --html-details "$report/index.html"
