@@ -142,9 +142,9 @@ public:
     const std::vector<std::string>& pathTsids() const { return m_linkable[1]; }
 
 private:
-    std::size_t scaled(std::size_t divisor, std::size_t least) const {
-        return std::max(least, m_n / divisor);
-    }
+    // A base that keeps small designs varied, plus a share that grows
+    // with the design.
+    std::size_t scaled(std::size_t divisor, std::size_t base) const { return base + m_n / divisor; }
     const std::string& block(std::size_t i) const { return kBlocks[i % kBlocks.size()]; }
     // A group that FROM, TO and PERIOD accept.
     const std::string& termGroup() {
@@ -162,7 +162,7 @@ private:
     bool spelling() { return m_rng.chance(50); }
 
     void nameGroups() {
-        std::size_t nTnm = scaled(40, 4);
+        std::size_t nTnm = scaled(200, 12);
         for (std::size_t i = 0; i < nTnm; ++i) {
             std::string kind = i % 9 == 4 ? "pads" : kKinds[(i / 3) % kKinds.size()];
             m_tnm.push_back(block(i) + num(i % 5) + "_" + kind + num(i));
@@ -172,11 +172,11 @@ private:
         if (m_pads.empty())
             m_pads.push_back(m_tnm.front());
         m_tnmElems.resize(nTnm);
-        for (std::size_t i = 0; i < scaled(300, 2); ++i)
+        for (std::size_t i = 0; i < scaled(1000, 2); ++i)
             m_thru.push_back("tp_" + block(i + 3) + "_mux" + num(i));
-        for (std::size_t i = 0; i < scaled(2000, 1); ++i)
+        for (std::size_t i = 0; i < scaled(4000, 1); ++i)
             m_sync.push_back("sync_" + block(i + 5) + num(i));
-        for (std::size_t i = 0; i < scaled(1500, 2); ++i)
+        for (std::size_t i = 0; i < scaled(4000, 2); ++i)
             m_clocks.push_back(block(i + 7) + "_clk" + num(i));
     }
 
@@ -203,7 +203,7 @@ private:
                 m_otherRefs.push_back(
                     ref("u_sync" + num(s) + "/latch" + num(k), "TS_TPSYNC", m_sync[s]));
         }
-        std::size_t nNet = scaled(250, 5);
+        std::size_t nNet = scaled(500, 5);
         for (std::size_t i = 0; i < nNet; ++i)
             m_otherRefs.push_back(netTiming(i));
     }
@@ -243,7 +243,7 @@ private:
     }
 
     void makeUserGroups() {
-        std::size_t nUser = scaled(50, 4);
+        std::size_t nUser = scaled(200, 10);
         for (std::size_t u = 0; u < nUser; ++u)
             m_users.push_back("grp_" + block(u + 1) + "_" + num(u));
         std::vector<GenLine> defs;
@@ -295,7 +295,7 @@ private:
     enum class SpecKind { Period, Path, TigPath, Offset };
 
     void makeSpecs() {
-        std::size_t nSpec = scaled(35, 8);
+        std::size_t nSpec = scaled(100, 20);
         std::vector<SpecKind> kinds(nSpec);
         std::vector<bool> linked(nSpec, false);
         for (std::size_t s = 0; s < nSpec; ++s) {
@@ -428,7 +428,7 @@ private:
     }
 
     void makeOffsets() {
-        std::size_t nOffset = scaled(400, 3);
+        std::size_t nOffset = scaled(800, 3);
         for (std::size_t i = 0; i < nOffset; ++i) {
             Words w(spelling());
             const std::string& clk = m_rng.pick(m_clocks);
@@ -465,7 +465,7 @@ private:
         }
     }
 
-    std::size_t tigCount() const { return scaled(400, 2); }
+    std::size_t tigCount() const { return scaled(800, 2); }
     std::size_t globalTigCount() const { return 1 + m_n / 5000; }
 
     // TNM references fill the design up to about n properties; every TNM
@@ -505,18 +505,23 @@ private:
             m_otherRefs.push_back(ref("u_test/scan_en" + num(i), "TS_TIG", ""));
     }
 
-    // A clock, a THRU point and a net first, then whole TNM groups, so that
+    // A clock and a THRU point first, then whole TNM groups, so that
     // withdrawing the first few dozen elements cascades.
     std::vector<std::string> removeOrder() {
         std::vector<std::string> order;
         order.push_back(m_clockElems.front());
         for (const std::string& e : m_thruElems.front())
             order.push_back(e);
+        // Small groups first, in random order among equals: a few dozen
+        // elements empty several groups.
+        std::vector<std::pair<std::size_t, std::uint64_t>> keys;
+        for (std::size_t g = 0; g < m_tnm.size(); ++g)
+            keys.emplace_back(m_tnmElems[g].size(), m_rng.next());
         std::vector<std::size_t> groups(m_tnm.size());
         for (std::size_t g = 0; g < groups.size(); ++g)
             groups[g] = g;
-        for (std::size_t g = groups.size(); g > 1; --g)
-            std::swap(groups[g - 1], groups[m_rng.below(g)]);
+        std::sort(groups.begin(), groups.end(),
+                  [&keys](std::size_t a, std::size_t b) { return keys[a] < keys[b]; });
         for (std::size_t g : groups)
             for (const std::string& e : m_tnmElems[g])
                 order.push_back(e);
