@@ -37,8 +37,7 @@ TEST(Json, StringsEscapeAndReplaceLikeTheReference) {
             text += static_cast<char>(pool[next() % sizeof pool]);
         std::string ours;
         tsd_cli::appendJsonString(ours, text);
-        ASSERT_EQ(ours, reference(nlohmann::ordered_json(text)))
-            << testing::PrintToString(text);
+        ASSERT_EQ(ours, reference(nlohmann::ordered_json(text))) << testing::PrintToString(text);
     }
 }
 
@@ -79,7 +78,10 @@ TEST(Json, DocumentsAreLaidOutLikeTheReference) {
         {"empty", nlohmann::ordered_json::array()},
         {"nothing", nlohmann::ordered_json::object()},
         {"list",
-         {{{"file", "x"}, {"line", nullptr}, {"n", -3}, {"details", nlohmann::ordered_json::array()}},
+         {{{"file", "x"},
+           {"line", nullptr},
+           {"n", -3},
+           {"details", nlohmann::ordered_json::array()}},
           7,
           true,
           {nlohmann::ordered_json::array()}}},

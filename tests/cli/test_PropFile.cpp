@@ -151,9 +151,7 @@ TEST(PropFile, EveryWrittenLineReadsBackAsItself) {
                 EXPECT_EQ(parsed.element, word) << line;
             }
             EXPECT_EQ(parsed.value, "v = w") << line;
-            EXPECT_EQ(
-                formatPropLine(kind, parsed.element, parsed.name, parsed.value),
-                line);
+            EXPECT_EQ(formatPropLine(kind, parsed.element, parsed.name, parsed.value), line);
         }
     }
     EXPECT_EQ(formatPropLine(PropKind::Group, "", "g", ""), "group g =");

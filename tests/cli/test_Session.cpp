@@ -125,8 +125,7 @@ TEST(Session, AFailedBuildLeavesTheDesignToTheSession) {
     EXPECT_FALSE(session.built());
     // The design and its records are still there to look at.
     EXPECT_NE(session.design().findGroupByUserName("regs", false), nullptr);
-    EXPECT_EQ(session.refOf(0)->getOwner(),
-              session.design().findGroupByUserName("regs", false));
+    EXPECT_EQ(session.refOf(0)->getOwner(), session.design().findGroupByUserName("regs", false));
 }
 
 TEST(Session, UnreadableInputsAreIoErrors) {

@@ -330,21 +330,19 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
             .member("class", objectClass(found))
             .key("holders")
             .beginArray();
-        forEachHolderProp(session, holders,
-                          [&json](PropKind kind, std::string_view element, std::string_view name,
-                                  std::string_view value) {
-                              writeProp(json, kind, element, name, value);
-                          });
+        forEachHolderProp(
+            session, holders,
+            [&json](PropKind kind, std::string_view element, std::string_view name,
+                    std::string_view value) { writeProp(json, kind, element, name, value); });
         json.endArray();
         writeDiagnostics(json, session);
         json.endObject().finish();
         emit(options, out);
     } else {
-        forEachHolderProp(session, holders,
-                          [&out](PropKind kind, std::string_view element, std::string_view name,
-                                 std::string_view value) {
-                              appendPropLine(out, kind, element, name, value);
-                          });
+        forEachHolderProp(
+            session, holders,
+            [&out](PropKind kind, std::string_view element, std::string_view name,
+                   std::string_view value) { appendPropLine(out, kind, element, name, value); });
         emit(options, out);
         printDiagnostics(session);
     }
@@ -396,7 +394,10 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         JsonWriter json(out);
         json.beginObject().key("withdrawn").beginArray();
         for (std::size_t i = 0; i < unique.size(); ++i)
-            json.beginObject().member("element", unique[i]).member("records", counts[i]).endObject();
+            json.beginObject()
+                .member("element", unique[i])
+                .member("records", counts[i])
+                .endObject();
         json.endArray().key("trashed").beginArray();
         for (const Trashed& entry : trashed)
             json.beginObject()

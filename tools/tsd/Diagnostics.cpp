@@ -290,14 +290,14 @@ std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
                     const std::vector<std::size_t>& candidates = found->second;
                     auto kind = static_cast<std::size_t>(store[candidates.front()].kind);
                     std::size_t after = cursor[kind];
-                    auto next = after == kNone ? candidates.begin()
-                                               : std::upper_bound(candidates.begin(),
-                                                                  candidates.end(), after);
+                    auto next = after == kNone
+                                    ? candidates.begin()
+                                    : std::upper_bound(candidates.begin(), candidates.end(), after);
                     if (next != candidates.end())
                         chosen = *next;
                     else
-                        chosen = previousContext == message.context ? previousLine
-                                                                    : candidates.front();
+                        chosen =
+                            previousContext == message.context ? previousLine : candidates.front();
                     if (chosen != kNone && (after == kNone || chosen > after))
                         cursor[kind] = chosen;
                 }

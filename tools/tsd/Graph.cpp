@@ -4,9 +4,9 @@
 
 #include "tsd/Tsd.h"
 
-#include <unordered_map>
 #include <ostream>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 namespace tsd_cli {

@@ -15,7 +15,7 @@ std::size_t utf8Length(std::string_view text, std::size_t& bad) {
     auto byte = [&text](std::size_t i) { return static_cast<std::uint8_t>(text[i]); };
     std::uint8_t lead = byte(0);
     std::size_t length = 0;
-    std::uint8_t low = 0x80;  // the range of the second byte
+    std::uint8_t low = 0x80; // the range of the second byte
     std::uint8_t high = 0xBF;
     if (lead >= 0xC2 && lead <= 0xDF) {
         length = 2;
@@ -36,7 +36,8 @@ std::size_t utf8Length(std::string_view text, std::size_t& bad) {
         return 0;
     }
     for (std::size_t i = 1; i < length; ++i) {
-        if (i >= text.size() || byte(i) < (i == 1 ? low : 0x80) || byte(i) > (i == 1 ? high : 0xBF)) {
+        if (i >= text.size() || byte(i) < (i == 1 ? low : 0x80) ||
+            byte(i) > (i == 1 ? high : 0xBF)) {
             bad = i;
             return 0;
         }

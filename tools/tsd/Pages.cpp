@@ -52,7 +52,8 @@ void adviseLargePages(void* data, std::size_t size) {
     auto begin = (reinterpret_cast<std::uintptr_t>(data) + kLargePage - 1) & ~(kLargePage - 1);
     auto end = (reinterpret_cast<std::uintptr_t>(data) + size) & ~(kLargePage - 1);
     if (end > begin)
-        madvise(reinterpret_cast<void*>(begin), end - begin, MADV_HUGEPAGE); // a hint: failure is fine
+        madvise(reinterpret_cast<void*>(begin), end - begin,
+                MADV_HUGEPAGE); // a hint: failure is fine
 #else
     (void)data;
     (void)size;

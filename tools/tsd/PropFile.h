@@ -96,8 +96,8 @@ public:
     std::size_t add(const PropRecord& record);
     // Appends a record whose texts are copied into the arena (for records
     // made rather than read).
-    std::size_t add(PropKind kind, std::uint32_t file, std::uint32_t line,
-                    std::string_view element, std::string_view name, std::string_view value);
+    std::size_t add(PropKind kind, std::uint32_t file, std::uint32_t line, std::string_view element,
+                    std::string_view name, std::string_view value);
     void reserve(std::size_t records);
 
     const std::vector<PropRecord>& records() const { return m_records; }

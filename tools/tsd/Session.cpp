@@ -203,7 +203,8 @@ void Session::load(std::vector<InputFile> inputs) {
     m_displayFile = inputs.size() == 1 ? inputs.front().displayName : std::string();
     std::size_t lines = 0;
     for (const InputFile& input : inputs)
-        lines += static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
+        lines +=
+            static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
     // An upper bound: the pages of lines without a property are never touched.
     m_store.reserve(m_store.size() + lines);
     reserveLarge(m_refOf, m_refOf.size() + lines);
@@ -238,8 +239,11 @@ void Session::readPropFile(std::uint32_t file) {
         case LineStatus::Blank:
             break;
         case LineStatus::Malformed:
-            m_diags.push_back({m_store.fileName(file), static_cast<int>(lineNo), Severity::Error,
-                               std::move(error), {}});
+            m_diags.push_back({m_store.fileName(file),
+                               static_cast<int>(lineNo),
+                               Severity::Error,
+                               std::move(error),
+                               {}});
             error.clear();
             break;
         case LineStatus::Property: {
@@ -272,8 +276,11 @@ void Session::add(const PropRecord& record) {
 }
 
 void Session::lineError(const PropRecord& record, std::string text) {
-    m_diags.push_back({m_store.fileName(record), static_cast<int>(record.line), Severity::Error,
-                       std::move(text), {}});
+    m_diags.push_back({m_store.fileName(record),
+                       static_cast<int>(record.line),
+                       Severity::Error,
+                       std::move(text),
+                       {}});
 }
 
 void Session::feed(std::size_t index) {
