@@ -84,13 +84,9 @@ std::vector<Session*>& liveSessions() {
     return sessions;
 }
 
-} // namespace
-
 // Two pointers and two indexes per reference line.
 static_assert(sizeof(CliRef) <= 3 * sizeof(void*), "a reference record grew");
 static_assert(alignof(CliRef) <= alignof(void*), "the pool aligns to a pointer");
-
-namespace {
 
 BlockPool& refPool() {
     static BlockPool pool(sizeof(CliRef));
