@@ -59,7 +59,9 @@ struct TextSpan {
 };
 
 // One property handed to the builder, from a line of a property file or from
-// any other form of input that names the same three kinds of property.
+// any other form of input that names the same three kinds of property. A
+// span that lies in the file's text also says where that text stands, so a
+// writer can replace it in place.
 struct PropRecord {
     enum Field : std::uint8_t { Element = 1, Name = 2, Value = 4 };
 
