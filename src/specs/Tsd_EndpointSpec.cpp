@@ -30,7 +30,8 @@ Tsd_EndpointSpec::Tsd_EndpointSpec(const char* tsid)
 }
 
 Tsd_EndpointSpec::Tsd_EndpointSpec(const Tsd_EndpointSpec& other)
-    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup) {
+    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup),
+      m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {
     if (other.m_delay != nullptr)
         m_delay = std::make_unique<Tsd_TimeValue>(*other.m_delay);
     if (other.m_link != nullptr)
@@ -177,7 +178,7 @@ void Tsd_EndpointSpec::dump(DumpStream& stream, short indent) const {
                  text != nullptr ? std::string("   link: ") + text
                                  : std::string("   link with NULL TSid pointer"));
     }
-    if (hasPriority())
+    if (hasWrittenPriority())
         dumpLine(stream, indent, "   priority: " + std::to_string(m_priority));
     else
         dumpLine(stream, indent, "   priority unset");
