@@ -161,6 +161,43 @@ std::size_t scanNumber(const char* p, std::size_t length, bool allowSign) {
     return i;
 }
 
+bool isBareWord(const char* name, std::size_t length) {
+    if (length == 0)
+        return false;
+    for (std::size_t i = 0; i < length; ++i)
+        if (!isWordChar(name[i]))
+            return false;
+    return true;
+}
+
+void appendQuoted(std::string& out, const char* name, std::size_t length) {
+    const bool hasDouble = std::memchr(name, '"', length) != nullptr;
+    const bool hasSingle = std::memchr(name, '\'', length) != nullptr;
+    const char quote = hasDouble && !hasSingle ? '\'' : '"';
+    out += quote;
+    for (std::size_t i = 0; i < length; ++i) {
+        if (name[i] == quote)
+            out += quote;
+        out += name[i];
+    }
+    out += quote;
+}
+
+std::size_t patternKeywordLength(const char* p, std::size_t length) {
+    static const char* const kPatternKeywords[] = {"FFS", "LATCHES", "PADS", "RAMS", "PPS"};
+    if (length < 3)
+        return 0;
+    const char first = upper(p[0]);
+    if (first != 'F' && first != 'L' && first != 'P' && first != 'R')
+        return 0;
+    for (const char* keyword : kPatternKeywords) {
+        const std::size_t k = std::strlen(keyword);
+        if (k <= length && (k == length || p[k] == '(') && equalsUpper(p, k, keyword))
+            return k;
+    }
+    return 0;
+}
+
 // ---------------------------------------------------------------------------
 // Tokens
 
@@ -219,6 +256,46 @@ void Reader::push(TokenType type, std::uint32_t gapStart, std::uint32_t rawStart
     m_tokens.push_back(t);
 }
 
+namespace {
+
+// Where the quoted part that opens at `open` ends. Inside it, a doubled
+// quote stands for one quote character.
+struct QuoteScan {
+    std::uint32_t close = 0; // the closing quote
+    bool escaped = false;    // a doubled quote was met
+    int badCode = 0;         // unbalanced, or a control character at badPos
+    std::uint32_t badPos = 0;
+};
+
+QuoteScan scanQuote(const char* s, std::uint32_t n, std::uint32_t open) {
+    QuoteScan scan;
+    const char quote = s[open];
+    std::uint32_t i = open + 1;
+    while (i < n) {
+        const char c = s[i];
+        if (c == quote) {
+            if (i + 1 < n && s[i + 1] == quote) {
+                scan.escaped = true;
+                i += 2;
+                continue;
+            }
+            scan.close = i;
+            return scan;
+        }
+        if (isControl(c)) {
+            scan.badCode = CONSTRAINT_ERR_INVALID_CHARACTER;
+            scan.badPos = i;
+            return scan;
+        }
+        ++i;
+    }
+    scan.badCode = CONSTRAINT_ERR_UNBALANCED_QUOTE;
+    scan.badPos = open;
+    return scan;
+}
+
+} // namespace
+
 void Reader::tokenize() {
     const char* s = m_text;
     const std::uint32_t n = m_length;
@@ -245,6 +322,12 @@ void Reader::tokenize() {
             push(TokenType::End, gapStart, n, 0, sepPos, sepChar, sepCount);
             return;
         }
+        // A lexical error ends the token list: nothing after it is read.
+        auto bad = [&](int code, std::uint32_t at, std::uint32_t length) {
+            push(TokenType::Bad, gapStart, at, length, sepPos, sepChar, sepCount);
+            m_tokens.back().badCode = code;
+            push(TokenType::End, n, n, 0, sepPos, sepChar, 0);
+        };
         const char c = s[pos];
         if (c == ';') {
             push(TokenType::Semicolon, gapStart, pos, 1, sepPos, sepChar, sepCount);
@@ -252,34 +335,64 @@ void Reader::tokenize() {
             continue;
         }
         if (isQuote(c)) {
-            std::uint32_t close = pos + 1;
-            while (close < n && s[close] != c && !isControl(s[close]))
-                ++close;
-            if (close < n && s[close] == c) {
-                push(TokenType::Quoted, gapStart, pos, close - pos + 1, sepPos, sepChar, sepCount);
-                pos = close + 1;
-                continue;
+            const QuoteScan q = scanQuote(s, n, pos);
+            if (q.badCode != 0) {
+                bad(q.badCode, q.badPos,
+                    q.badCode == CONSTRAINT_ERR_UNBALANCED_QUOTE ? n - q.badPos : 1);
+                return;
             }
-            if (close < n) {
-                push(TokenType::Bad, gapStart, close, 1, sepPos, sepChar, sepCount);
-                m_tokens.back().badCode = CONSTRAINT_ERR_INVALID_CHARACTER;
-            } else {
-                push(TokenType::Bad, gapStart, pos, n - pos, sepPos, sepChar, sepCount);
-                m_tokens.back().badCode = CONSTRAINT_ERR_UNBALANCED_QUOTE;
-            }
-            push(TokenType::End, n, n, 0, sepPos, sepChar, 0);
-            return;
+            push(TokenType::Quoted, gapStart, pos, q.close - pos + 1, sepPos, sepChar, sepCount);
+            m_tokens.back().cooked = q.escaped;
+            pos = q.close + 1;
+            continue;
         }
         if (isControl(c)) {
-            push(TokenType::Bad, gapStart, pos, 1, sepPos, sepChar, sepCount);
-            m_tokens.back().badCode = CONSTRAINT_ERR_INVALID_CHARACTER;
-            push(TokenType::End, n, n, 0, sepPos, sepChar, 0);
+            bad(CONSTRAINT_ERR_INVALID_CHARACTER, pos, 1);
             return;
         }
         const std::uint32_t begin = pos;
         while (pos < n && isWordChar(s[pos]))
             ++pos;
+        bool cooked = false;
+        if (const std::size_t k = patternKeywordLength(s + begin, pos - begin)) {
+            // A predefined-group pattern, KEYWORD(...): blanks may stand
+            // before the "(", and quoted parts inside the parentheses belong
+            // to the word.
+            std::uint32_t p = begin + static_cast<std::uint32_t>(k);
+            if (p == pos) {
+                std::uint32_t j = pos;
+                while (j < n && isBlank(s[j]))
+                    ++j;
+                cooked = j > pos && j < n && s[j] == '(';
+                p = cooked ? j : 0;
+            }
+            if (p != 0) {
+                int depth = 0;
+                while (p < n) {
+                    const char d = s[p];
+                    if (d == '(') {
+                        ++depth;
+                    } else if (d == ')') {
+                        depth -= depth > 0 ? 1 : 0;
+                    } else if (isQuote(d) && depth > 0) {
+                        const QuoteScan q = scanQuote(s, n, p);
+                        if (q.badCode != 0) {
+                            bad(q.badCode, q.badPos,
+                                q.badCode == CONSTRAINT_ERR_UNBALANCED_QUOTE ? n - q.badPos : 1);
+                            return;
+                        }
+                        cooked = true;
+                        p = q.close;
+                    } else if (!isWordChar(d)) {
+                        break;
+                    }
+                    ++p;
+                }
+                pos = p;
+            }
+        }
         push(TokenType::Word, gapStart, begin, pos - begin, sepPos, sepChar, sepCount);
+        m_tokens.back().cooked = cooked;
     }
 }
 
@@ -294,7 +407,36 @@ void Reader::advance() {
 }
 
 const char* Reader::text(const Token& t) {
-    return pooledPrefix(t, t.length);
+    if (!t.cooked)
+        return pooledPrefix(t, t.length);
+    if (t.pooled >= 0)
+        return &m_pool[static_cast<std::size_t>(t.pooled)];
+    // The decoded text is never longer than the raw one, for which start()
+    // made room. Outside quotes only the blanks before a pattern's "(" are
+    // dropped; inside them a doubled quote is one quote.
+    char* out = &m_pool[m_poolUsed];
+    std::size_t length = 0;
+    char quote = 0;
+    const char* s = m_text + t.rawStart;
+    for (std::uint32_t i = 0; i < t.rawLength; ++i) {
+        const char c = s[i];
+        if (quote != 0) {
+            if (c != quote)
+                out[length++] = c;
+            else if (i + 1 < t.rawLength && s[i + 1] == quote)
+                out[length++] = s[i++];
+            else
+                quote = 0;
+        } else if (isQuote(c)) {
+            quote = c;
+        } else if (!isBlank(c)) {
+            out[length++] = c;
+        }
+    }
+    out[length] = '\0';
+    t.pooled = static_cast<std::int32_t>(m_poolUsed);
+    m_poolUsed += length + 1;
+    return out;
 }
 
 const char* Reader::pooledPrefix(const Token& t, std::uint32_t length) {

@@ -70,6 +70,9 @@ struct Token {
     std::uint32_t length = 0;
     mutable std::int32_t pooled = -1; // offset of its zero-terminated copy in the pool
     int badCode = 0;                  // the lexical error of a Bad token
+    // The text is not the raw span: a doubled quote inside quotes, or a
+    // pattern whose quotes and blanks before "(" are dropped.
+    bool cooked = false;
 };
 
 // What the gap in front of a token may hold.
@@ -233,6 +236,20 @@ struct PeriodOptions {
 };
 // PHASE and PRIORITY only when `full` (the net PERIOD has neither).
 bool readPeriodOptions(Reader& r, bool full, PeriodOptions& out);
+
+// Whether `name`, written bare between separators, reads back as exactly
+// `name`: a non-empty run of characters other than blanks, ':', '=', ';',
+// quotes and control characters.
+bool isBareWord(const char* name, std::size_t length);
+// Appends `name` in quotes that read back as `name`: double quotes, or
+// single ones when it holds a double quote but no single one, or else double
+// quotes with each double quote inside doubled. (A control character reads
+// back in no form: the tokenizer refuses it everywhere.)
+void appendQuoted(std::string& out, const char* name, std::size_t length);
+// Length of the predefined-group keyword (FFS, LATCHES, PADS, RAMS, PPS, any
+// case) at the start of [p, p + length) when the word goes on with "(" or
+// ends there; 0 otherwise.
+std::size_t patternKeywordLength(const char* p, std::size_t length);
 
 // Word classification, exposed for tests.
 Keyword classifyWord(const char* word, std::size_t length);
