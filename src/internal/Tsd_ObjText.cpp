@@ -63,6 +63,15 @@ void appendConstraintName(std::string& out, const char* name) {
         out.append(name, length);
 }
 
+void appendLinkTSid(std::string& out, const char* tsid) {
+    const size_t length = std::strlen(tsid);
+    if (startsWithNoCase(tsid, "TS") && tsd_constraint::isBareWord(tsid, length) &&
+        std::strpbrk(tsid, "*/") == nullptr)
+        out.append(tsid, length);
+    else
+        tsd_constraint::appendQuoted(out, tsid, length);
+}
+
 void dumpLine(DumpStream& stream, int level, const std::string& text) {
     stream << indent(level) << text.c_str() << DumpStream::endl;
 }

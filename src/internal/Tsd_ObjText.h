@@ -33,6 +33,11 @@ bool startsWithNoCase(const char* text, const char* prefix);
 // read as a keyword. A null or empty name is written as "".
 void appendConstraintName(std::string& out, const char* name);
 
+// Appends the TSid of a link as constraint text writes it: bare when it
+// reads back as a link (a word that begins with "TS" and holds no "*" or
+// "/"), quoted otherwise.
+void appendLinkTSid(std::string& out, const char* tsid);
+
 // One dump line: the indentation of `level`, the text, the end of line.
 void dumpLine(DumpStream& stream, int level, const std::string& text);
 

@@ -5,6 +5,7 @@
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
 
+#include <cstring>
 #include <string>
 #include <unordered_set>
 #include <vector>
@@ -155,8 +156,18 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
     if (m_delay != nullptr) {
         buffer.copy(m_delay->getString(":"));
     } else if (m_link != nullptr) {
-        // A pending link writes nothing.
-        buffer.copy(formatLink(m_link.get(), ""));
+        // A pending link writes nothing; a TSid that would not read back as
+        // a link is quoted.
+        const char* text = formatLink(m_link.get(), "");
+        if (text == nullptr) {
+            buffer.clear();
+        } else {
+            std::string written;
+            const char* tsid = m_link->spec->getTSid();
+            tsd_detail::appendLinkTSid(written, tsid);
+            written += text + std::strlen(tsid);
+            buffer.copy(written.c_str());
+        }
     } else {
         return nullptr;
     }

@@ -106,9 +106,11 @@ PropSet awkwardCorpus() {
         {"TS04", "FROM FFS (data*) TO \"it's \"\"x\"\"\" TS02 * 2 PRIORITY -1"},
         {"TS05", "PERIOD FFS('a b') TS02 / 2 PRIORITY -1"},
         {"TS 6", "THRU \"thru 1\" TO pads (\"A<*>\") 1 ns"},
+        {"TS07", "FROM \"my group\" TO \"both \" \"TS 6\" / 4"},
         {"OFFSET", "IN 2 ns BEFORE \"clk a\" TIMEGRP \"both \" REFERENCE_PIN \"fb:net\""},
         {"TS_G",
          "TIMEGRP FFS (\"a b\") OFFSET = OUT 1 ns AFTER \"clk'b\" TIMEGRP \"RISING\" RISING"},
+        {"ENABLE", "\"reg sr:o\""},
     };
     return set;
 }
@@ -156,10 +158,11 @@ TEST(RoundTrip, AwkwardNamesAreQuotedAndPatternsCanonical) {
             {"TS04", "FROM:FFS(data*):TO:\"it's \"\"x\"\"\":TS02*2:PRIORITY:-1"},
             {"TS05", "PERIOD:\"FFS(a b)\":TS02/2:PRIORITY:-1"},
             {"TS 6", "THRU:\"thru 1\":TO:pads(A<*>):1000:pS"},
+            {"TS07", "FROM:\"my group\":TO:\"both \":\"TS 6\"/4"},
             {"OFFSET", "IN:2000:pS:BEFORE:\"clk a\":REFERENCE_PIN:\"fb:net\":TIMEGRP:\"both \""},
             {"TS_GROUP_BASED_OFFSET",
-             "TIMEGRP:\"FFS(a "
-             "b)\":OFFSET=OUT:1000:pS:AFTER:\"clk'b\":TIMEGRP:\"RISING\":RISING"}}));
+             "TIMEGRP:\"FFS(a b)\":OFFSET=OUT:1000:pS:AFTER:\"clk'b\":TIMEGRP:\"RISING\":RISING"},
+            {"ENABLE", "\"reg sr:o\""}}));
     EXPECT_EQ(written.refs[13], (tsd_test::RefProp{"n1", "TS_FEEDBACK", "1000:pS:NET:\"fb:net\""}));
     EXPECT_EQ(
         written.refs[14],
