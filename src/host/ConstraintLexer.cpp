@@ -70,7 +70,7 @@ struct KeywordEntry {
     Keyword keyword;
 };
 
-const KeywordEntry kKeywords[] = {
+constexpr KeywordEntry kKeywords[] = {
     {"TIMEGRP", KW_TIMEGRP},
     {"TIMESPEC", KW_TIMESPEC},
     {"EXCEPT", KW_EXCEPT},
@@ -189,32 +189,31 @@ const UnitEntry* unitOf(Unit unit) {
     return &kUnits[unit - U_PS];
 }
 
-} // namespace
-
-namespace {
-
 // Up to the first 8 bytes of a word, each with bit 0x20 cleared: for the
 // letters and "_" that keywords are made of this is the upper case, and no
-// other byte that a word may hold becomes one of them. With `canRead8`, the
-// 8 bytes at `word` may be read whatever the length.
-std::uint64_t packUpper(const char* word, std::size_t length, bool canRead8 = false) {
-    constexpr std::uint64_t kClear = 0xDFDFDFDFDFDFDFDFull;
-#if defined(__BYTE_ORDER__) && __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__
-    if (canRead8) {
-        std::uint64_t packed;
-        std::memcpy(&packed, word, 8);
-        if (length < 8)
-            packed &= (std::uint64_t(1) << (8 * length)) - 1;
-        return packed & kClear;
-    }
-#else
-    (void)canRead8;
-#endif
+// other byte that a word may hold becomes one of them.
+constexpr std::uint64_t kClearCase = 0xDFDFDFDFDFDFDFDFull;
+
+constexpr std::uint64_t packUpper(const char* word, std::size_t length) {
     std::uint64_t packed = 0;
     const std::size_t n = length < 8 ? length : 8;
     for (std::size_t i = 0; i < n; ++i)
         packed |= std::uint64_t(static_cast<unsigned char>(word[i])) << (8 * i);
-    return packed & kClear;
+    return packed & kClearCase;
+}
+
+// The same where the 8 bytes at `word` may be read whatever the length: one
+// load instead of a loop.
+std::uint64_t packUpperAt(const char* word, std::size_t length) {
+#if defined(__BYTE_ORDER__) && __BYTE_ORDER__ == __ORDER_LITTLE_ENDIAN__
+    std::uint64_t packed;
+    std::memcpy(&packed, word, 8);
+    if (length < 8)
+        packed &= (std::uint64_t(1) << (8 * length)) - 1;
+    return packed & kClearCase;
+#else
+    return packUpper(word, length);
+#endif
 }
 
 // The keywords in an open-addressed table keyed by their packed first 8
@@ -231,12 +230,14 @@ struct KeywordTable {
     // most names are refused by this alone.
     std::uint32_t firstLetters[kMaxKeywordLength + 1] = {};
 
-    static std::size_t slotOf(std::uint64_t packed, std::size_t length) {
+    static constexpr std::size_t slotOf(std::uint64_t packed, std::size_t length) {
         return static_cast<std::size_t>(((packed ^ length) * 0x9E3779B97F4A7C15ull) >> 58);
     }
-    KeywordTable() {
+    constexpr KeywordTable() {
         for (const KeywordEntry& entry : kKeywords) {
-            const std::size_t n = std::strlen(entry.text);
+            std::size_t n = 0;
+            while (entry.text[n] != 0)
+                ++n;
             const std::uint64_t packed = packUpper(entry.text, n);
             std::size_t i = slotOf(packed, n);
             while (slots[i].length != 0)
@@ -246,11 +247,7 @@ struct KeywordTable {
         }
     }
 };
-const KeywordTable kKeywordTable;
-
-} // namespace
-
-namespace {
+constexpr KeywordTable kKeywordTable;
 
 // Whether a word may be a keyword at all, by its length and first letter:
 // most names and every number are refused by this alone.
@@ -261,7 +258,7 @@ inline bool mayBeKeyword(const char* word, std::size_t length) {
 }
 
 Keyword lookupKeyword(const char* word, std::size_t length, bool canRead8) {
-    const std::uint64_t packed = packUpper(word, length, canRead8);
+    const std::uint64_t packed = canRead8 ? packUpperAt(word, length) : packUpper(word, length);
     for (std::size_t i = KeywordTable::slotOf(packed, length);;
          i = (i + 1) % KeywordTable::kSlots) {
         const KeywordTable::Slot& slot = kKeywordTable.slots[i];
