@@ -10,16 +10,6 @@ namespace tsd_cli {
 
 namespace {
 
-bool sameLettersOtherCase(std::string_view a, std::string_view b) {
-    if (a.size() != b.size() || a == b)
-        return false;
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (std::tolower(static_cast<unsigned char>(a[i])) !=
-            std::tolower(static_cast<unsigned char>(b[i])))
-            return false;
-    return true;
-}
-
 // The edit distance of a and b counting a swap of neighbours as one edit,
 // or bound + 1 when it exceeds the bound. Only the diagonal band of width
 // 2 * bound + 1 is computed, and the walk stops when a whole row exceeds
@@ -76,6 +66,16 @@ private:
 
 } // namespace
 
+bool equalsNoCase(std::string_view a, std::string_view b) {
+    if (a.size() != b.size())
+        return false;
+    for (std::size_t i = 0; i < a.size(); ++i)
+        if (std::toupper(static_cast<unsigned char>(a[i])) !=
+            std::toupper(static_cast<unsigned char>(b[i])))
+            return false;
+    return true;
+}
+
 std::optional<std::string> closestName(std::string_view name,
                                        const std::vector<std::string>& defined) {
     int bound = std::max(1, std::min(2, static_cast<int>(name.size()) / 3));
@@ -83,7 +83,7 @@ std::optional<std::string> closestName(std::string_view name,
     const std::string* best = nullptr;
     int bestScore = bound + 1;
     for (const std::string& candidate : defined) {
-        if (sameLettersOtherCase(name, candidate))
+        if (candidate != name && equalsNoCase(name, candidate))
             return candidate; // nothing is closer
         if (candidate == name)
             continue;

@@ -9,6 +9,9 @@
 
 namespace tsd_cli {
 
+// Keywords and attribute names compare without regard to case (ASCII).
+bool equalsNoCase(std::string_view a, std::string_view b);
+
 // The defined name closest to `name`, if one is close: the same letters in
 // another case come first, then the fewest edits (a letter inserted, deleted
 // or replaced, or two neighbours swapped), at most two and at most a third

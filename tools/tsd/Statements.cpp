@@ -1,5 +1,7 @@
 #include "Statements.h"
 
+#include "Hints.h"
+
 #include <algorithm>
 #include <cctype>
 #include <stdexcept>
@@ -18,16 +20,6 @@ bool isBlank(char c) {
 // Ends a bare word of a statement.
 bool isSeparator(char c) {
     return isBlank(c) || c == '\n' || c == '=' || c == ';' || c == '|' || c == ':';
-}
-
-bool equalsNoCase(std::string_view a, std::string_view b) {
-    if (a.size() != b.size())
-        return false;
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (std::toupper(static_cast<unsigned char>(a[i])) !=
-            std::toupper(static_cast<unsigned char>(b[i])))
-            return false;
-    return true;
 }
 
 bool commentAt(std::string_view text, std::size_t pos, std::size_t limit) {
