@@ -117,7 +117,7 @@ class NameIndex {
 public:
     explicit NameIndex(const PropStore& store) {
         for (std::size_t i = 0; i < store.size(); ++i) {
-            const PropRecord& record = store[i];
+            const StoredProp& record = store[i];
             std::string_view name = store.name(record);
             std::string_view value = store.value(record);
             if (record.kind == PropKind::Group) {
@@ -242,7 +242,7 @@ void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
     diags.push_back(std::move(diag));
 }
 
-std::string processingContext(const PropStore& store, const PropRecord& record) {
+std::string processingContext(const PropStore& store, const StoredProp& record) {
     const char* what = record.kind == PropKind::Group ? "TIMEGRP" : "TIMESPEC";
     std::string context = std::string("Processing ") + what + " definition \"";
     context += store.name(record);
@@ -312,7 +312,7 @@ std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
             chosen = recordForQuotedName(store, names, message.text);
         }
         if (chosen != kNone) {
-            const PropRecord& record = store[chosen];
+            const StoredProp& record = store[chosen];
             addLibraryMessage(diags, message.severity, message.text, store.fileName(record),
                               static_cast<int>(record.line));
         } else {

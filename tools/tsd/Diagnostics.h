@@ -40,7 +40,7 @@ void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
                        const std::string& text, const std::string& file, int line);
 
 // The context under which the builder processes a stored group or spec record.
-std::string processingContext(const PropStore& store, const PropRecord& record);
+std::string processingContext(const PropStore& store, const StoredProp& record);
 
 // Ties the messages of a build to the records of `store` (in the order they
 // were handed to the builder): messages issued while a stored property was

@@ -231,7 +231,7 @@ void PropStore::reserve(std::size_t records) {
     reserveLarge(m_records, records);
 }
 
-std::size_t PropStore::add(const PropRecord& record) {
+std::size_t PropStore::add(const StoredProp& record) {
     m_records.push_back(record);
     return m_records.size() - 1;
 }
@@ -239,14 +239,14 @@ std::size_t PropStore::add(const PropRecord& record) {
 std::size_t PropStore::add(PropKind kind, std::uint32_t file, std::uint32_t line,
                            std::string_view element, std::string_view name,
                            std::string_view value) {
-    PropRecord record;
+    StoredProp record;
     record.kind = kind;
     record.file = file;
     record.line = line;
     record.element = keep(element);
     record.name = keep(name);
     record.value = keep(value);
-    record.inArena = PropRecord::Element | PropRecord::Name | PropRecord::Value;
+    record.inArena = StoredProp::Element | StoredProp::Name | StoredProp::Value;
     return add(record);
 }
 

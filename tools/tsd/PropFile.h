@@ -9,7 +9,7 @@
 // ends. Blank lines and lines whose first non-blank character is '#' are
 // ignored.
 //
-// Whatever the input format, what reaches the builder is a PropRecord: a
+// Whatever the input format, what reaches the builder is a StoredProp: a
 // compact record whose texts are spans of its file's text, kept once in a
 // PropStore, or of the store's arena for texts that are not in the file as
 // they are (a name whose escapes were undone).
@@ -62,7 +62,7 @@ struct TextSpan {
 // any other form of input that names the same three kinds of property. A
 // span that lies in the file's text also says where that text stands, so a
 // writer can replace it in place.
-struct PropRecord {
+struct StoredProp {
     enum Field : std::uint8_t { Element = 1, Name = 2, Value = 4 };
 
     TextSpan element; // refs only
@@ -95,27 +95,27 @@ public:
     TextSpan keep(std::string_view text);
 
     // Appends a record; its index.
-    std::size_t add(const PropRecord& record);
+    std::size_t add(const StoredProp& record);
     // Appends a record whose texts are copied into the arena (for records
     // made rather than read).
     std::size_t add(PropKind kind, std::uint32_t file, std::uint32_t line, std::string_view element,
                     std::string_view name, std::string_view value);
     void reserve(std::size_t records);
 
-    const std::vector<PropRecord>& records() const { return m_records; }
-    const PropRecord& operator[](std::size_t index) const { return m_records[index]; }
+    const std::vector<StoredProp>& records() const { return m_records; }
+    const StoredProp& operator[](std::size_t index) const { return m_records[index]; }
     std::size_t size() const { return m_records.size(); }
 
-    std::string_view element(const PropRecord& record) const {
-        return text(record, record.element, PropRecord::Element);
+    std::string_view element(const StoredProp& record) const {
+        return text(record, record.element, StoredProp::Element);
     }
-    std::string_view name(const PropRecord& record) const {
-        return text(record, record.name, PropRecord::Name);
+    std::string_view name(const StoredProp& record) const {
+        return text(record, record.name, StoredProp::Name);
     }
-    std::string_view value(const PropRecord& record) const {
-        return text(record, record.value, PropRecord::Value);
+    std::string_view value(const StoredProp& record) const {
+        return text(record, record.value, StoredProp::Value);
     }
-    const std::string& fileName(const PropRecord& record) const { return fileName(record.file); }
+    const std::string& fileName(const StoredProp& record) const { return fileName(record.file); }
 
 private:
     struct File {
@@ -123,7 +123,7 @@ private:
         std::string text;
     };
 
-    std::string_view text(const PropRecord& record, TextSpan span, PropRecord::Field field) const {
+    std::string_view text(const StoredProp& record, TextSpan span, StoredProp::Field field) const {
         std::string_view base =
             (record.inArena & field) != 0 ? std::string_view(m_arena) : fileText(record.file);
         return base.substr(span.offset, span.length);
@@ -131,7 +131,7 @@ private:
 
     std::vector<File> m_files;
     std::string m_arena;
-    std::vector<PropRecord> m_records;
+    std::vector<StoredProp> m_records;
 };
 
 // A name or element as written in a property file: bare when it reads back

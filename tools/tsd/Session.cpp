@@ -243,19 +243,19 @@ void Session::readPropFile(std::uint32_t file) {
             error.clear();
             break;
         case LineStatus::Property: {
-            PropRecord record;
+            StoredProp record;
             record.kind = fields.kind;
             record.file = file;
             record.line = lineNo;
-            auto span = [&](const Word& word, PropRecord::Field field) {
+            auto span = [&](const Word& word, StoredProp::Field field) {
                 if (!word.escaped)
                     return m_store.spanIn(file, word.text);
                 record.inArena |= field;
                 return m_store.keep(word.str());
             };
             if (fields.kind == PropKind::Ref)
-                record.element = span(fields.element, PropRecord::Element);
-            record.name = span(fields.name, PropRecord::Name);
+                record.element = span(fields.element, StoredProp::Element);
+            record.name = span(fields.name, StoredProp::Name);
             record.value = m_store.spanIn(file, fields.value);
             add(record);
             break;
@@ -265,13 +265,13 @@ void Session::readPropFile(std::uint32_t file) {
     }
 }
 
-void Session::add(const PropRecord& record) {
+void Session::add(const StoredProp& record) {
     std::size_t index = m_store.add(record);
     m_refOf.push_back(nullptr);
     feed(index);
 }
 
-void Session::lineError(const PropRecord& record, std::string text) {
+void Session::lineError(const StoredProp& record, std::string text) {
     m_diags.push_back({m_store.fileName(record),
                        static_cast<int>(record.line),
                        Severity::Error,
@@ -280,7 +280,7 @@ void Session::lineError(const PropRecord& record, std::string text) {
 }
 
 void Session::feed(std::size_t index) {
-    const PropRecord& record = m_store[index];
+    const StoredProp& record = m_store[index];
     std::string_view name = m_store.name(record);
     std::string_view value = m_store.value(record);
     // The builder takes zero-terminated texts.
@@ -393,7 +393,7 @@ int Session::warningCount() const {
 
 int Session::countOf(PropKind kind) const {
     int count = 0;
-    for (const PropRecord& record : m_store.records())
+    for (const StoredProp& record : m_store.records())
         if (record.kind == kind)
             ++count;
     return count;
@@ -450,7 +450,7 @@ void Session::deliver(const MessageRecord& record) {
     if (m_building) {
         m_buildMessages.push_back({record.severity, record.text, m_builder->context()});
     } else if (m_currentRecord >= 0) {
-        const PropRecord& prop = m_store[static_cast<std::size_t>(m_currentRecord)];
+        const StoredProp& prop = m_store[static_cast<std::size_t>(m_currentRecord)];
         addLibraryMessage(m_diags, record.severity, record.text, m_store.fileName(prop),
                           static_cast<int>(prop.line));
     } else {

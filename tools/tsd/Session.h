@@ -9,10 +9,10 @@
 // A reader of another input format feeds the same records:
 //   std::uint32_t file = session.addFile(std::move(input));
 //   std::string_view text = session.store().fileText(file);
-//   PropRecord record;               // kind, file, line, column and spans:
+//   StoredProp record;               // kind, file, line, column and spans:
 //   record.name = session.store().spanIn(file, nameInText);   // text as is
 //   record.value = session.store().keep(madeValue);            // or a copy
-//   record.inArena |= PropRecord::Value;
+//   record.inArena |= StoredProp::Value;
 //   session.add(record);             // messages of the hand-over go to its line
 //   ...
 //   session.build();
@@ -116,7 +116,7 @@ public:
     // store. Throws IoError when the files together pass PropStore::kMaxText.
     std::uint32_t addFile(InputFile input);
     // Stores a record and hands it to the builder.
-    void add(const PropRecord& record);
+    void add(const StoredProp& record);
     PropStore& store() { return m_store; }
     const PropStore& store() const { return m_store; }
 
@@ -160,7 +160,7 @@ private:
 
     void readPropFile(std::uint32_t file);
     void feed(std::size_t index);
-    void lineError(const PropRecord& record, std::string text);
+    void lineError(const StoredProp& record, std::string text);
     void attributeBuildMessages();
 
     ScopedMessageSink m_sinkGuard{this};
