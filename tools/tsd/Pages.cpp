@@ -47,7 +47,7 @@ void unpoison(void* data, std::size_t size) {
 
 } // namespace
 
-void adviseLargePages(void* data, std::size_t size) {
+void adviseLargePages(const void* data, std::size_t size) {
 #if defined(__linux__) && defined(MADV_HUGEPAGE)
     auto begin = (reinterpret_cast<std::uintptr_t>(data) + kLargePage - 1) & ~(kLargePage - 1);
     auto end = (reinterpret_cast<std::uintptr_t>(data) + size) & ~(kLargePage - 1);

@@ -11,7 +11,7 @@ namespace tsd_cli {
 
 // On Linux, offers [data, data + size) large pages, which spares one page
 // fault per 4 KiB; does nothing where it does not apply.
-void adviseLargePages(void* data, std::size_t size);
+void adviseLargePages(const void* data, std::size_t size);
 
 // Reserves room for `count` elements of `buffer` (a std::vector or
 // std::string) and offers it large pages.

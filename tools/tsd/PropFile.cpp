@@ -1,7 +1,5 @@
 #include "PropFile.h"
 
-#include "Pages.h"
-
 #include <cstdio>
 #include <stdexcept>
 
@@ -225,10 +223,6 @@ TextSpan PropStore::keep(std::string_view text) {
                   static_cast<std::uint32_t>(text.size())};
     m_arena.append(text);
     return span;
-}
-
-void PropStore::reserve(std::size_t records) {
-    reserveLarge(m_records, records);
 }
 
 std::size_t PropStore::add(const StoredProp& record) {

@@ -100,7 +100,7 @@ public:
     // made rather than read).
     std::size_t add(PropKind kind, std::uint32_t file, std::uint32_t line, std::string_view element,
                     std::string_view name, std::string_view value);
-    void reserve(std::size_t records);
+    void reserve(std::size_t records) { m_records.reserve(records); }
 
     const std::vector<StoredProp>& records() const { return m_records; }
     const StoredProp& operator[](std::size_t index) const { return m_records[index]; }

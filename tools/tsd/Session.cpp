@@ -203,6 +203,8 @@ void Session::load(std::vector<InputFile> inputs) {
             static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
     // An upper bound: the pages of lines without a property are never touched.
     m_store.reserve(m_store.size() + lines);
+    const std::vector<StoredProp>& records = m_store.records();
+    adviseLargePages(records.data(), records.capacity() * sizeof(StoredProp));
     reserveLarge(m_refOf, m_refOf.size() + lines);
     std::vector<std::uint32_t> files;
     for (InputFile& input : inputs)
