@@ -107,6 +107,7 @@ TEST(PropFile, MalformedLinesSayWhatIsWrong) {
         {"group a = b\x01", "control character 0x01 in column 12"},
         {"group a\x7f = b", "control character 0x7F in column 8"},
         {"group a = b\rc", "control character 0x0D in column 12"},
+        {"group\tabcdefghij = b\x02 and more", "control character 0x02 in column 21"},
     };
     for (const Case& c : cases) {
         Parsed parsed = parse(c.text);

@@ -1,24 +1,68 @@
 #include "PropFile.h"
 
+#include <cstdint>
 #include <cstdio>
+#include <cstring>
 #include <stdexcept>
 
 namespace tsd_cli {
 
 namespace {
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t';
+// What each byte is to a property line, looked up rather than compared.
+enum : std::uint8_t { kBlank = 1, kEndsBare = 2, kControl = 4 };
+
+struct CharClasses {
+    std::uint8_t of[256] = {};
+    constexpr CharClasses() {
+        for (int c = 0; c < 256; ++c) {
+            if (c == ' ' || c == '\t')
+                of[c] |= kBlank | kEndsBare;
+            if (c == '=' || c == '"')
+                of[c] |= kEndsBare;
+            if ((c < 0x20 && c != '\t') || c == 0x7f)
+                of[c] |= kControl;
+        }
+    }
+};
+constexpr CharClasses kClasses;
+
+bool is(char c, std::uint8_t what) {
+    return (kClasses.of[static_cast<unsigned char>(c)] & what) != 0;
 }
 
-bool isControl(char c) {
-    auto u = static_cast<unsigned char>(c);
-    return (u < 0x20 && c != '\t') || u == 0x7f;
+bool isBlank(char c) {
+    return is(c, kBlank);
 }
 
 // Ends a bare word.
 bool endsBareWord(char c) {
-    return isBlank(c) || c == '=' || c == '"';
+    return is(c, kEndsBare);
+}
+
+// Where the first control character (a tab is none) stands, or npos. Eight
+// bytes at a time, since almost every line has none: a word with no byte
+// below 0x20 and none equal to 0x7F is passed over whole.
+std::size_t firstControl(std::string_view text) {
+    constexpr std::uint64_t kOnes = 0x0101010101010101u;
+    constexpr std::uint64_t kHighs = 0x8080808080808080u;
+    std::size_t i = 0;
+    for (; i + 8 <= text.size(); i += 8) {
+        std::uint64_t word;
+        std::memcpy(&word, text.data() + i, 8);
+        std::uint64_t below = (word - kOnes * 0x20) & ~word & kHighs;
+        std::uint64_t del = word ^ (kOnes * 0x7F);
+        std::uint64_t isDel = (del - kOnes) & ~del & kHighs;
+        if ((below | isDel) == 0)
+            continue;
+        for (std::size_t j = i; j < i + 8; ++j)
+            if (is(text[j], kControl))
+                return j;
+    }
+    for (; i < text.size(); ++i)
+        if (is(text[i], kControl))
+            return i;
+    return std::string_view::npos;
 }
 
 // A cursor over one line that reads the words of a property.
@@ -140,14 +184,11 @@ std::string Word::str() const {
 LineStatus parsePropLine(std::string_view text, PropFields& prop, std::string& error) {
     if (!text.empty() && text.back() == '\r')
         text.remove_suffix(1);
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        if (isControl(text[i])) {
-            char code[8];
-            std::snprintf(code, sizeof code, "0x%02X", static_cast<unsigned char>(text[i]));
-            error =
-                std::string("control character ") + code + " in column " + std::to_string(i + 1);
-            return LineStatus::Malformed;
-        }
+    if (std::size_t i = firstControl(text); i != std::string_view::npos) {
+        char code[8];
+        std::snprintf(code, sizeof code, "0x%02X", static_cast<unsigned char>(text[i]));
+        error = std::string("control character ") + code + " in column " + std::to_string(i + 1);
+        return LineStatus::Malformed;
     }
 
     LineReader reader(text);
