@@ -134,6 +134,8 @@ private:
     short m_numError = 0;
     short m_numWarning = 0;
     Tsd_BaseObjList m_unresolvedGroups{10};
+    // Finds placeholders by name; made on first use.
+    mutable std::unique_ptr<tsd_detail::NameIndex> m_unresolvedIndex;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_specProps;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_groupProps;
     DARRAY_Tsd_PendPtr m_pendingLinks;

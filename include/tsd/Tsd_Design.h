@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 
 #include "tsd/Tsd_BaseObj.h"
 #include "tsd/Tsd_Groups.h"
@@ -118,6 +119,10 @@ private:
         Tsd_BaseObjList trash{10};
     };
 
+    // The name indexes of the four finds, made on first use.
+    struct FindIndexes;
+    FindIndexes& findIndexes() const;
+
     // Moves obj from the active list to the trash; false if not active.
     static bool moveToTrash(ListPair& pair, Tsd_BaseObj* obj);
     void dumpList(DumpStream& stream, short indent, const ListPair& pair) const;
@@ -136,4 +141,5 @@ private:
     ListPair m_portSpecs;
     Tsd_String m_refType;
     Tsd_TIGGroup* m_globalTIG = nullptr;
+    mutable std::unique_ptr<FindIndexes> m_findIndexes;
 };

@@ -17,7 +17,7 @@ public:
     void dump(DumpStream& stream, short indent) const override;
 
     const char* getName() const { return m_name.get(); }
-    void setName(const char* name) { m_name.set(name); }
+    void setName(const char* name);
 
 protected:
     explicit Tsd_Group(const char* name);

@@ -2,6 +2,7 @@
 // into objects of the design.
 #include "tsd/Tsd_Builder.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Parsers.h"

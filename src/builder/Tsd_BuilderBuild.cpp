@@ -2,6 +2,7 @@
 // pending, and handing out the design when no error was counted.
 #include "tsd/Tsd_Builder.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Parsers.h"
 

@@ -1,6 +1,7 @@
 // The specification base, endpoint specifications and TSid links.
 #include "tsd/Tsd_Specs.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
@@ -20,6 +21,12 @@ Tsd_Spec::Tsd_Spec(const Tsd_Spec& other)
     : Tsd_BaseObj(other), m_tsid(other.m_tsid), m_scope(other.m_scope) {}
 
 Tsd_Spec::~Tsd_Spec() = default;
+
+void Tsd_Spec::setTSid(const char* tsid) {
+    m_tsid.set(tsid);
+    // The design's lookups by TSid catch up with the change.
+    tsd_detail::noteNameChange();
+}
 
 // --- Tsd_EndpointSpec ------------------------------------------------------
 
