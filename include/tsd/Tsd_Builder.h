@@ -6,6 +6,7 @@
 
 #include <memory>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 #include "tsd/Tsd_BaseObj.h"
@@ -139,6 +140,8 @@ private:
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_specProps;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_groupProps;
     DARRAY_Tsd_PendPtr m_pendingLinks;
+    // Where each spec's pending link record stands in m_pendingLinks.
+    std::unordered_map<const Tsd_Spec*, std::size_t> m_pendingLinkSlot;
     Tsd_String m_pendingLinkTSid;
     DARRAY_Tsd_PendPtr m_pendingRegGroups;
     Tsd_String m_pendingRegGroupName;

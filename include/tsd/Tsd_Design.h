@@ -28,7 +28,8 @@ public:
 
 protected:
     // Called once for every object that trim() moves to trash, right after
-    // the move. The base does nothing; derive to log or count removals.
+    // the move. The base does nothing; derive to log or count removals. It
+    // must leave the design as it is: trim plans its cascade ahead.
     virtual void reportObjTrashed(Tsd_BaseObj* obj, TrimReason reason);
 
 public:
@@ -129,6 +130,9 @@ private:
 
     int trimRefObjs(ListPair& pair);
     int trimUserGroups();
+    // Every pass of trimUserGroups until one trashes nothing, computed in
+    // one sweep; the same groups go in the same order.
+    int trimUserGroupsToTheEnd();
     void unlinkTrash();
 
     ListPair m_groups;

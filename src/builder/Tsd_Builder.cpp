@@ -347,12 +347,13 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
 }
 
 void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec) {
-    for (auto it = m_pendingLinks.begin(); it != m_pendingLinks.end(); ++it) {
-        if (*it != nullptr && (*it)->spec == spec) {
-            m_pendingLinks.erase(it);
-            return;
-        }
-    }
+    // The record's entry is cleared rather than erased: every reader skips
+    // cleared entries, and the positions of the others stay valid.
+    auto it = m_pendingLinkSlot.find(spec);
+    if (it == m_pendingLinkSlot.end())
+        return;
+    m_pendingLinks[it->second].reset();
+    m_pendingLinkSlot.erase(it);
 }
 
 Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
@@ -402,6 +403,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         Tsd_EndpointSpec* endpoint = spec->getEndpointSpec();
         if (endpoint == nullptr)
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
+        m_pendingLinkSlot[endpoint] = m_pendingLinks.size();
         m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
         m_pendingLinkTSid.set(nullptr);
     }

@@ -1,3 +1,4 @@
+#include "../design/RandomDesigns.h"
 #include "BuilderTestSupport.h"
 
 #include <gtest/gtest.h>
@@ -238,19 +239,23 @@ TEST(BuilderBuild, TIGInstallationAndTheGlobalTIG) {
 TEST(BuilderBuild, ClockNetsWithoutTheirPropertyAreReportedWithTheirHolders) {
     MessageCapture capture;
     PropSet set;
-    set.refs = {{"f", "TS_TNM", "pads"}};
+    set.refs = {{"f", "TS_TNM", "pads"}, {"p", "TS_FEEDBACK", "1 ns NET sysclk"}};
     set.specs = {{"OFFSET", "IN 2 ns BEFORE sysclk"},
+                 {"OFFSET", "IN 3 ns BEFORE altclk"},
                  {"TS_GROUP_BASED_OFFSET", "TIMEGRP pads OFFSET = OUT 1 ns AFTER sysclk"}};
     Built built = build(set);
     EXPECT_EQ(built.design, nullptr);
-    EXPECT_EQ(built.errors, 1);
-    EXPECT_EQ(capture.sink.errors(),
-              (std::vector<std::string>{"The following spec(s) referenced the Tsd_ClkGroup "
-                                        "\"sysclk\", but no such TS_CLKGRP reference property was "
-                                        "added to the builder:\n"}));
-    EXPECT_EQ(capture.sink.statuses(),
-              (std::vector<std::string>{"   OFFSET=IN 2000 pS BEFORE sysclk\n",
-                                        "   TIMEGRP pads OFFSET=OUT 1000 pS AFTER sysclk\n"}));
+    EXPECT_EQ(built.errors, 2);
+    // Per clock group: the offsets that name it, then the port timings.
+    EXPECT_EQ(capture.sink.transcript(),
+              "error: The following spec(s) referenced the Tsd_ClkGroup \"sysclk\", but no such "
+              "TS_CLKGRP reference property was added to the builder:\n"
+              "status:    OFFSET=IN 2000 pS BEFORE sysclk\n"
+              "status:    TIMEGRP pads OFFSET=OUT 1000 pS AFTER sysclk\n"
+              "status:    FEEDBACK=1000 pS NET sysclk\n"
+              "error: The following spec(s) referenced the Tsd_ClkGroup \"altclk\", but no such "
+              "TS_CLKGRP reference property was added to the builder:\n"
+              "status:    OFFSET=IN 3000 pS BEFORE altclk\n");
 }
 
 namespace {
@@ -444,4 +449,48 @@ TEST(BuilderBuild, NamesThatNeedQuotesCanBeDefined) {
             "TIMEGRP:\nx y=a::b\n      ^\n",
             "Processing TIMESPEC definition \"TS 2=BOGUS:a\": Encountered bad token \"BOGUS\" "
             "in TIMESPEC:\nTS 2=BOGUS:a\n     ^\n"}));
+}
+
+// The builder checks every user group and every spec with shared walks; the
+// messages and counts must be those of checking each one alone.
+TEST(BuilderBuild, WholeDesignChecksMatchCheckingEachGroupAndSpecAlone) {
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        Tsd_Design shared, alone;
+        tsd_test::fillGroups(seed, shared);
+        tsd_test::fillGroups(seed, alone);
+        tsd_test::fillSpecs(seed, shared);
+        tsd_test::fillSpecs(seed, alone);
+        std::string sharedText, aloneText;
+        short sharedCount = 0;
+        int aloneCount = 0;
+        {
+            MessageCapture capture;
+            OpenBuilder builder(false);
+            builder.initBaseBuilder(&shared);
+            sharedText = fatalText([&] {
+                builder.validateUserGroups();
+                builder.resolvePendingLinks();
+            });
+            sharedText += capture.sink.transcript();
+            sharedCount = builder.getNumError();
+        }
+        {
+            MessageCapture capture;
+            aloneText = fatalText([&] {
+                for (Tsd_BaseObjList* list : {alone.getGroupList(), alone.getEndpointSpecList()}) {
+                    Tsd_BaseObjListIter iter(list);
+                    while (Tsd_BaseObj* obj = iter.next()) {
+                        if (Tsd_UserGroup* group = obj->getUserGroup())
+                            aloneCount += group->checkInExcludes(true);
+                        else if (Tsd_EndpointSpec* spec = obj->getEndpointSpec())
+                            aloneCount += spec->checkLink(true);
+                    }
+                }
+            });
+            aloneText += capture.sink.transcript();
+        }
+        ASSERT_EQ(sharedText, aloneText);
+        ASSERT_EQ(sharedCount, aloneCount);
+    }
 }
