@@ -41,6 +41,8 @@ const char* const kLogicalForms[] = {
     "TIMEGRP pads_# OFFSET = OUT 1.5 ns AFTER clk_# TIMEGRP regs_# HIGH ;",
     "timespec TS#13 = from a_# to b_# 1e-3 us datapathonly priority 7 ;",
     "TIMEGRP group_# = FFS(data_#*) RISING clocks_# EXCEPT \"slow ffs\" ;",
+    "TIMEGRP cpu_addr_# = pads(\"A<*>\") LATCHES (top/\"a b\"/*) \"say \"\"#\"\"\" ;",
+    "TIMESPEC TS#14 = FROM FFS(\"*hist_pre_#*\") TO rams (\"*i_huffman_#*\") 5 ns PRIORITY -1 ;",
 };
 
 const char* const kNetForms[] = {
@@ -53,6 +55,7 @@ const char* const kNetForms[] = {
     "OFFSET=OUT:0:AFTER:clk_#: ;",
     "PERIOD = 10 ns HIGH 50 ;",
     "OFFSET = OUT 3 AFTER \"clk #\" LOW ;",
+    "OFFSET = IN 2 ns BEFORE clk_# TIMEGRP FFS (\"regs_#*\") ;",
 };
 
 // Texts packed into one buffer, each ending in its zero, as they would sit

@@ -9,3 +9,9 @@ if(TSD_SANITIZE)
   target_compile_options(tsd_compile_options INTERFACE ${_tsd_san})
   target_link_options(tsd_compile_options INTERFACE ${_tsd_san})
 endif()
+if(TSD_COVERAGE)
+  # Line and branch counts for the coverage report; no optimisation, so that
+  # every line counts where it stands.
+  target_compile_options(tsd_compile_options INTERFACE --coverage -O0)
+  target_link_options(tsd_compile_options INTERFACE --coverage)
+endif()

@@ -3,7 +3,7 @@
 # machine lacks. Does nothing when everything is present.
 set -euo pipefail
 
-packages=(cmake ninja-build g++ libgtest-dev libbenchmark-dev clang-format
+packages=(cmake ninja-build g++ libgtest-dev libbenchmark-dev clang-format gcovr
           clang libclang-rt-14-dev nlohmann-json3-dev libcli11-dev graphviz pkgconf)
 
 missing=()

@@ -98,8 +98,20 @@ public:
 
     bool hasPriority() const { return m_priority != -1; }
     int getPriority() const { return m_priority; }
-    void setPriority(int priority) { m_priority = priority; }
-    void clearPriority() { m_priority = -1; }
+    void setPriority(int priority) {
+        m_priority = priority;
+        m_priorityWrittenAsNone = false;
+    }
+    void clearPriority() { setPriority(-1); }
+    // A priority of -1 as the constraint text wrote it. It reads as no
+    // priority like any -1, but is written back and dumped, so that the
+    // text keeps it; setPriority and clearPriority forget it.
+    void setWrittenPriority(int priority) {
+        setPriority(priority);
+        m_priorityWrittenAsNone = priority == -1;
+    }
+    // A priority to write: one that is set, or -1 as written.
+    bool hasWrittenPriority() const { return hasPriority() || m_priorityWrittenAsNone; }
 
     Tsd_TIGGroup* getIgnoreGroup() const { return m_ignoreGroup; }
     void setIgnoreGroup(Tsd_TIGGroup* group) { m_ignoreGroup = group; }
@@ -122,6 +134,7 @@ private:
     std::unique_ptr<LinkData> m_link;
     std::int32_t m_priority;
     Tsd_TIGGroup* m_ignoreGroup;
+    bool m_priorityWrittenAsNone = false;
 };
 
 // "TS02*2", or with a separator "TS02 * 2"; null for a pending link.

@@ -38,7 +38,9 @@ private:
 
 class Tsd_Util {
 public:
-    // The name as written in constraint text: in double quotes when its first
-    // character could not begin a bare name. Valid until the next call.
+    // The name as written in constraint text: quoted when its first
+    // character could not begin a bare name, or when bare it would not read
+    // back as this one name (blanks, separators, quotes, a member keyword).
+    // Valid until the next call.
     static const char* getAnnoName(const char* name);
 };

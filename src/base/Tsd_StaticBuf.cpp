@@ -1,11 +1,12 @@
 #include "tsd/Tsd_StaticBuf.h"
 
+#include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_PropBuffers.h"
 #include "internal/Tsd_Report.h"
 
-#include <cctype>
 #include <climits>
 #include <cstring>
+#include <string>
 
 Tsd_StaticBuf::Tsd_StaticBuf(int initialSize, int increment)
     : m_limit(initialSize > 0 ? initialSize : 1), m_size(1),
@@ -85,18 +86,11 @@ const char* Tsd_Util::getAnnoName(const char* name) {
     static Tsd_StaticBuf buffer(32, 16);
     if (name == nullptr || *name == 0)
         return "\"\"";
-    unsigned char first = static_cast<unsigned char>(name[0]);
-    bool quote;
-    if (first == '/')
-        quote = name[1] == 0 || name[1] == '/';
-    else
-        quote = !(std::isalnum(first) || std::strchr("$&_-<>", first) != nullptr);
-    buffer.clear();
-    if (quote)
-        buffer.cat("\"");
-    buffer.cat(name);
-    if (quote)
-        buffer.cat("\"");
+    // Composed apart first: `name` may point into the buffer.
+    static std::string text;
+    text.clear();
+    tsd_detail::appendConstraintName(text, name);
+    buffer.copy(text.c_str());
     return buffer.getBuffer();
 }
 

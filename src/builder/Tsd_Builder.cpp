@@ -40,23 +40,25 @@ bool oneOf(const char* name, const char* const (&names)[N]) {
     return false;
 }
 
-// A defined name as the parser must see it: quoted when it holds a blank, a
-// separator or a quote of the other kind, so that it reads back as one name.
-std::string nameForText(const char* name, bool& quoted) {
-    const std::string text = name;
-    quoted = text.find_first_of(" \t\n\r\v\f:=;'\"") != std::string::npos;
-    if (!quoted)
-        return text;
-    const char quote = text.find('"') == std::string::npos ? '"' : '\'';
-    return quote + text + quote;
+// A defined name as the parser must see it: written as every name in
+// constraint text is, so that it reads back as one name.
+std::string nameForText(const char* name) {
+    std::string text;
+    tsd_detail::appendConstraintName(text, name);
+    return text;
 }
 
 // The caret line under an echoed "name=value" for a bad token at text column
-// `column`, where the name starts at column `prefix` (quoted or not).
-std::string caretLine(int column, int prefix, const char* name, bool quoted) {
+// `column`, where the name starts at column `prefix`: the text holds the name
+// as `written`, the echo as it is.
+std::string caretLine(int column, int prefix, const std::string& written, const char* name) {
     int spaces = column - prefix;
-    if (quoted)
-        spaces -= column > prefix + static_cast<int>(std::strlen(name)) ? 2 : 1;
+    const int writtenLength = static_cast<int>(written.size());
+    const int nameLength = static_cast<int>(std::strlen(name));
+    if (column >= prefix + writtenLength)
+        spaces -= writtenLength - nameLength;
+    else if (writtenLength != nameLength && column > prefix)
+        spaces -= 1; // inside the quotes
     return std::string(static_cast<size_t>(spaces > 0 ? spaces : 0), ' ') + "^";
 }
 
@@ -295,8 +297,8 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
 
 bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value) {
     const char* name = orEmpty(group->getName());
-    bool quoted = false;
-    std::string text = "TIMEGRP " + nameForText(name, quoted) + "=" + value + " ;";
+    const std::string written = nameForText(name);
+    std::string text = "TIMEGRP " + written + "=" + value + " ;";
     m_specGroupParser->setNewGroup(group);
     m_specGroupParser->clearError();
     if (m_specGroupParser->parse(text.c_str())) {
@@ -305,7 +307,7 @@ bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value)
         const char* token = m_specGroupParser->getBadToken();
         if (offset >= prefix && token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP:\n%s=%s\n%s\n", getContext(),
-                            token, name, value, caretLine(offset, prefix, name, quoted).c_str());
+                            token, name, value, caretLine(offset, prefix, written, name).c_str());
         else if (token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMEGRP.\n", getContext(), token);
         else
@@ -362,7 +364,8 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
     // Columns of the echoed "name=value" line start `shift` characters
     // before the parsed text's.
     int shift = 0;
-    bool quoted = false;
+    // The name as the text holds it; the echo shows it as it is.
+    std::string written = name;
     if (equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
         equalsNoCase(name, "DISABLE")) {
         text = std::string(name) + "=" + value + " ;";
@@ -372,7 +375,8 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         prefix = 1;
         shift = static_cast<int>(std::strlen(name)) + 1;
     } else {
-        text = "TIMESPEC " + nameForText(name, quoted) + "=" + value + " ;";
+        written = nameForText(name);
+        text = "TIMESPEC " + written + "=" + value + " ;";
         prefix = 10;
     }
     m_specGroupParser->clearError();
@@ -391,7 +395,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         if (offset >= prefix && token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC:\n%s=%s\n%s\n",
                             getContext(), token, name, value,
-                            caretLine(offset + shift, prefix, name, quoted).c_str());
+                            caretLine(offset + shift, prefix, written, name).c_str());
         else if (token != nullptr)
             TSD_MSG().error("%zEncountered bad token \"%s\" in TIMESPEC.\n", getContext(), token);
         else

@@ -60,16 +60,20 @@ enum Keyword : std::uint8_t {
 struct Token {
     TokenType type = TokenType::End;
     Keyword keyword = KW_NONE; // always KW_NONE for quoted names
-    std::uint8_t sepCount = 0; // ':' and '=' in the gap before the token, at most 3 kept
+    std::uint8_t sepCount = 0; // ':' and '=' in the gap before the token, at most 3 counted
     char sepChar[3] = {0, 0, 0};
-    std::uint32_t sepPos[3] = {0, 0, 0};
+    // The text is not the raw span: a doubled quote inside quotes, or a
+    // pattern whose quotes and blanks before "(" are dropped.
+    bool cooked = false;
+    std::uint8_t badCode = 0;   // the lexical error of a Bad token
     std::uint32_t gapStart = 0; // the gap before the token is [gapStart, rawStart)
     std::uint32_t rawStart = 0; // the token as written, quotes included
     std::uint32_t rawLength = 0;
-    std::uint32_t start = 0; // its text, quotes excluded
-    std::uint32_t length = 0;
     mutable std::int32_t pooled = -1; // offset of its zero-terminated copy in the pool
-    int badCode = 0;                  // the lexical error of a Bad token
+
+    // Its text as written, the quotes of a quoted name excluded.
+    std::uint32_t start() const { return rawStart + (type == TokenType::Quoted ? 1 : 0); }
+    std::uint32_t length() const { return type == TokenType::Quoted ? rawLength - 2 : rawLength; }
 };
 
 // What the gap in front of a token may hold.
@@ -114,15 +118,21 @@ public:
     bool start(const char* text);
 
     const Token& tok() const { return m_tokens[m_index]; }
-    const Token& peek(std::size_t ahead = 1) const;
-    void advance();
+    const Token& peek(std::size_t ahead = 1) const {
+        std::size_t i = m_index + ahead;
+        return i < m_tokens.size() ? m_tokens[i] : m_tokens.back();
+    }
+    void advance() {
+        if (m_index + 1 < m_tokens.size())
+            ++m_index;
+    }
 
     bool isName(const Token& t) const {
         return t.type == TokenType::Word || t.type == TokenType::Quoted;
     }
     // The error for an empty quoted name (""), which names nothing.
     bool checkNotEmpty(const Token& t) {
-        return t.length > 0 || fail(CONSTRAINT_ERR_EXPECTED_NAME, t);
+        return t.length() > 0 || fail(CONSTRAINT_ERR_EXPECTED_NAME, t);
     }
     bool at(Keyword keyword) const { return isKeyword(tok(), keyword); }
     static bool isKeyword(const Token& t, Keyword keyword) {
@@ -142,7 +152,14 @@ public:
     int errorColumn() const { return m_errorColumn; }
     const char* errorToken() const { return m_errorToken.c_str(); }
 
-    bool checkGap(const Token& t, Gap gap);
+    bool checkGap(const Token& t, Gap gap) {
+        // The common case, blanks and at most one ':' between two tokens,
+        // without a call.
+        if (gap == Gap::Normal && t.gapStart != t.rawStart &&
+            (t.sepCount == 0 || (t.sepCount == 1 && t.sepChar[0] == ':')))
+            return true;
+        return checkGapSlow(t, gap);
+    }
 
     // Zero-terminated copy of a token's text, valid until the next start().
     const char* text(const Token& t);
@@ -170,10 +187,10 @@ public:
     std::vector<const char*> excludes;
 
 private:
+    bool checkGapSlow(const Token& t, Gap gap);
+    // Where the i-th ':' or '=' of a token's gap stands.
+    std::uint32_t separatorPos(const Token& t, int i) const;
     void tokenize();
-    void push(TokenType type, std::uint32_t gapStart, std::uint32_t rawStart,
-              std::uint32_t rawLength, const std::uint32_t* sepPos, const char* sepChar,
-              std::uint8_t sepCount);
     bool readQuantityIn(const Token& t, std::uint32_t offset, const QuantitySpec& spec,
                         bool allowSign, Quantity& out);
     bool convert(const char* number, std::uint32_t length, unsigned unit, std::uint32_t valuePos,
@@ -234,8 +251,23 @@ struct PeriodOptions {
 // PHASE and PRIORITY only when `full` (the net PERIOD has neither).
 bool readPeriodOptions(Reader& r, bool full, PeriodOptions& out);
 
-// Word classification, exposed for tests.
-Keyword classifyWord(const char* word, std::size_t length);
+// Whether `name`, written bare between separators, reads back as exactly
+// `name`: a non-empty run of characters other than blanks, ':', '=', ';',
+// quotes and control characters.
+bool isBareWord(const char* name, std::size_t length);
+// Appends `name` in quotes that read back as `name`: double quotes, or
+// single ones when it holds a double quote but no single one, or else double
+// quotes with each double quote inside doubled. (A control character reads
+// back in no form: the tokenizer refuses it everywhere.)
+void appendQuoted(std::string& out, const char* name, std::size_t length);
+// Length of the predefined-group keyword (FFS, LATCHES, PADS, RAMS, PPS, any
+// case) at the start of [p, p + length) when the word goes on with "(" or
+// ends there; 0 otherwise.
+std::size_t patternKeywordLength(const char* p, std::size_t length);
+
+// Word classification, exposed for tests. With `canRead8`, the 8 bytes at
+// `word` may be read whatever `length` is.
+Keyword classifyWord(const char* word, std::size_t length, bool canRead8 = false);
 // Length of the number at the start of [p, p + length): digits with an
 // optional point and exponent, and a sign when allowed; 0 when none.
 std::size_t scanNumber(const char* p, std::size_t length, bool allowSign);

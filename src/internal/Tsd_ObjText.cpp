@@ -1,6 +1,9 @@
 #include "internal/Tsd_ObjText.h"
 
+#include <cctype>
 #include <cstring>
+
+#include "host/ConstraintLexer.h"
 
 #include "internal/Tsd_PropBuffers.h"
 #include "internal/Tsd_Report.h"
@@ -34,6 +37,39 @@ bool startsWithNoCase(const char* text, const char* keyword, size_t length) {
 
 bool startsWithNoCase(const char* text, const char* prefix) {
     return prefix != nullptr && startsWithNoCase(text, prefix, std::strlen(prefix));
+}
+
+void appendConstraintName(std::string& out, const char* name) {
+    if (name == nullptr || *name == 0) {
+        out += "\"\"";
+        return;
+    }
+    const size_t length = std::strlen(name);
+    const auto first = static_cast<unsigned char>(name[0]);
+    bool quote;
+    if (first == '/')
+        quote = name[1] == 0 || name[1] == '/';
+    else
+        quote = !(std::isalnum(first) || std::strchr("$&_-<>", first) != nullptr);
+    if (!quote)
+        quote = !tsd_constraint::isBareWord(name, length);
+    if (!quote) {
+        for (const char* keyword : {"RISING", "FALLING", "TRANSHI", "TRANSLO", "EXCEPT"})
+            quote = quote || equalsNoCase(name, keyword);
+    }
+    if (quote)
+        tsd_constraint::appendQuoted(out, name, length);
+    else
+        out.append(name, length);
+}
+
+void appendLinkTSid(std::string& out, const char* tsid) {
+    const size_t length = std::strlen(tsid);
+    if (startsWithNoCase(tsid, "TS") && tsd_constraint::isBareWord(tsid, length) &&
+        std::strpbrk(tsid, "*/") == nullptr)
+        out.append(tsid, length);
+    else
+        tsd_constraint::appendQuoted(out, tsid, length);
 }
 
 void dumpLine(DumpStream& stream, int level, const std::string& text) {

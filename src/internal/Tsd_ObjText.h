@@ -25,6 +25,19 @@ bool startsWithNoCase(const char* text, const char* keyword, size_t length);
 // True when `text` begins with the whole of `prefix`.
 bool startsWithNoCase(const char* text, const char* prefix);
 
+// Appends a name as constraint text writes it, so that it reads back as the
+// same name wherever a name stands: bare, or in quotes (appendQuoted) when
+// its first character could not begin a bare name (not a letter, digit or
+// one of "$&_-<>", or "/" alone or before "/"), when it would not read as one
+// word, or when it is an edge keyword or EXCEPT, which a member list would
+// read as a keyword. A null or empty name is written as "".
+void appendConstraintName(std::string& out, const char* name);
+
+// Appends the TSid of a link as constraint text writes it: bare when it
+// reads back as a link (a word that begins with "TS" and holds no "*" or
+// "/"), quoted otherwise.
+void appendLinkTSid(std::string& out, const char* tsid);
+
 // One dump line: the indentation of `level`, the text, the end of line.
 void dumpLine(DumpStream& stream, int level, const std::string& text);
 

@@ -1,9 +1,11 @@
 // The OFFSET feature reducer.
 #include "tsd/Tsd_Parsers.h"
 
+#include "host/ConstraintLexer.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 
+#include <cctype>
 #include <cstdlib>
 #include <cstring>
 
@@ -19,9 +21,32 @@ bool isSeparator(char c) {
     return c == ':' || c == '=' || c == ' ';
 }
 
-// Splits at ':', '=' and blanks; a quoted part is one token, without quotes.
-std::vector<std::string> tokenize(const std::string& text) {
-    std::vector<std::string> tokens;
+bool isSpace(char c) {
+    return std::isspace(static_cast<unsigned char>(c)) != 0;
+}
+
+struct Token {
+    std::string text;
+    bool quoted = false; // a quoted part made it: never a keyword
+};
+
+// Moves token `from` to the next kept place.
+void keep(std::vector<Token>& tokens, size_t& kept, size_t from) {
+    if (kept != from)
+        tokens[kept] = std::move(tokens[from]);
+    ++kept;
+}
+
+bool isKeyword(const Token& token, const char* keyword) {
+    return !token.quoted && equalsNoCase(token.text.c_str(), keyword);
+}
+
+// Splits at ':', '=' and blanks; a quoted part belongs to its token without
+// its quotes (a doubled quote inside stands for one). A predefined-group
+// keyword followed by blanks and "(" goes on as one pattern without the
+// blanks, as the parsers read it.
+std::vector<Token> tokenize(const std::string& text) {
+    std::vector<Token> tokens;
     size_t i = 0;
     const size_t n = text.size();
     while (i < n) {
@@ -29,29 +54,41 @@ std::vector<std::string> tokenize(const std::string& text) {
             ++i;
             continue;
         }
-        std::string token;
-        while (i < n && !isSeparator(text[i])) {
+        Token token;
+        std::string& t = token.text;
+        while (i < n) {
             char c = text[i];
+            if (isSpace(c) && !t.empty() &&
+                tsd_constraint::patternKeywordLength(t.data(), t.size()) == t.size()) {
+                size_t j = i;
+                while (j < n && isSpace(text[j]))
+                    ++j;
+                if (j < n && text[j] == '(') {
+                    i = j;
+                    continue;
+                }
+            }
+            if (isSeparator(c))
+                break;
             if (c == '"' || c == '\'') {
-                size_t close = text.find(c, i + 1);
-                if (close == std::string::npos)
-                    close = n; // an unbalanced quote runs to the end
-                token.append(text, i + 1, close - i - 1);
-                i = close < n ? close + 1 : n;
+                // An unbalanced quote runs to the end.
+                token.quoted = true;
+                size_t k = i + 1;
+                while (k < n && (text[k] != c || (k + 1 < n && text[k + 1] == c))) {
+                    if (text[k] == c)
+                        ++k;
+                    t += text[k];
+                    ++k;
+                }
+                i = k < n ? k + 1 : n;
             } else {
-                token += c;
+                t += c;
                 ++i;
             }
         }
         tokens.push_back(std::move(token));
     }
     return tokens;
-}
-
-bool needsQuotes(const std::string& token) {
-    // Besides blanks, tabs and colons, '=' and ';' would also split or end
-    // the token when the reduced text is parsed.
-    return token.empty() || token.find_first_of(" \t:=;") != std::string::npos;
 }
 
 } // namespace
@@ -84,51 +121,56 @@ bool Tsd_OffsetBonusParser::reduceOffset(const char* text) {
     while (!body.empty() && (body.back() == ';' || body.back() == ' '))
         body.pop_back();
 
-    std::vector<std::string> tokens = tokenize(body);
+    std::vector<Token> tokens = tokenize(body);
     size_t at = 0;
     size_t required = 4;
-    if (tokens.size() >= 4 && equalsNoCase(tokens[0].c_str(), "TIMEGRP")) {
+    if (tokens.size() >= 4 && isKeyword(tokens[0], "TIMEGRP")) {
         at = 2;
         required = 6;
     }
-    if (tokens.size() < required || !equalsNoCase(tokens[at].c_str(), "OFFSET"))
+    if (tokens.size() < required || !isKeyword(tokens[at], "OFFSET"))
         return false;
 
     size_t valueAt = at + 2;
     size_t scan = valueAt;
-    if (equalsNoCase(tokens[valueAt].c_str(), "BEFORE") ||
-        equalsNoCase(tokens[valueAt].c_str(), "AFTER")) {
+    if (isKeyword(tokens[valueAt], "BEFORE") || isKeyword(tokens[valueAt], "AFTER")) {
         m_hasValue = false;
-        tokens.insert(tokens.begin() + static_cast<std::ptrdiff_t>(valueAt), "0");
+        tokens.insert(tokens.begin() + static_cast<std::ptrdiff_t>(valueAt), Token{"0", false});
         scan = valueAt + 2;
     }
-    while (scan < tokens.size()) {
-        const char* token = tokens[scan].c_str();
-        if (equalsNoCase(token, "REFERENCE_PIN")) {
+    // The tokens that stay are moved up over the removed ones in one pass.
+    size_t kept = scan;
+    for (; scan < tokens.size(); ++scan) {
+        const Token& token = tokens[scan];
+        if (isKeyword(token, "REFERENCE_PIN")) {
             if (scan + 1 >= tokens.size())
                 break; // a trailing REFERENCE_PIN stays in the text
-            m_refPin = tokens[scan + 1];
-            tokens.erase(tokens.begin() + static_cast<std::ptrdiff_t>(scan),
-                         tokens.begin() + static_cast<std::ptrdiff_t>(scan + 2));
-        } else if (equalsNoCase(token, "RISING")) {
+            m_refPin = tokens[++scan].text;
+        } else if (isKeyword(token, "RISING")) {
             m_regEdge = Tsd_UserGroup::EDGE_RISING;
-            tokens.erase(tokens.begin() + static_cast<std::ptrdiff_t>(scan));
-        } else if (equalsNoCase(token, "FALLING")) {
+        } else if (isKeyword(token, "FALLING")) {
             m_regEdge = Tsd_UserGroup::EDGE_FALLING;
-            tokens.erase(tokens.begin() + static_cast<std::ptrdiff_t>(scan));
         } else {
-            ++scan;
+            keep(tokens, kept, scan);
         }
     }
+    for (; scan < tokens.size(); ++scan)
+        keep(tokens, kept, scan);
+    tokens.resize(kept);
     if (m_hasValue && m_refPin.empty() && m_regEdge == Tsd_UserGroup::EDGE_ANY)
         return false;
 
-    for (const std::string& token : tokens) {
-        if (needsQuotes(token))
-            m_reduced += '"' + token + '"';
+    for (const Token& token : tokens) {
+        // Quoted so that the parser reads it back as this one token, and
+        // never as a keyword if it was quoted here.
+        const std::string& t = token.text;
+        if (tsd_constraint::isBareWord(t.data(), t.size()) &&
+            !(token.quoted &&
+              tsd_constraint::classifyWord(t.data(), t.size()) != tsd_constraint::KW_NONE))
+            m_reduced += t;
         else
-            m_reduced += token;
-        m_reduced += equalsNoCase(token.c_str(), "OFFSET") ? "=" : ":";
+            tsd_constraint::appendQuoted(m_reduced, t.data(), t.size());
+        m_reduced += isKeyword(token, "OFFSET") ? "=" : ":";
     }
     m_reduced += " ;";
 

@@ -204,7 +204,7 @@ bool Tsd_SpecGroupParser::cb_tspec_period(const char* tsid, const char* group, c
     if (inputJitterPs != nullptr)
         period->setInputJitter(picoseconds(*inputJitterPs));
     if (priority != kNoPriority)
-        period->setPriority(priority);
+        period->setWrittenPriority(priority);
     if (periodGroup != nullptr)
         store(std::move(period));
     return true;
@@ -219,7 +219,7 @@ bool Tsd_SpecGroupParser::cb_tspec_maxdelay(const char* tsid, bool hasFrom, bool
     bool found = addFromToThru(path.get(), hasFrom, hasTo, groups, m_builder);
     setDelayOrLink(path.get(), linkTsid, multiply, valueOrFactor, isTime);
     if (priority != kNoPriority)
-        path->setPriority(priority);
+        path->setWrittenPriority(priority);
     if (dataPathOnly)
         path->setDataPathOnly();
     if (found)
@@ -234,7 +234,7 @@ bool Tsd_SpecGroupParser::cb_tspec_tig(const char* tsid, bool hasFrom, bool hasT
     bool found = addFromToThru(path.get(), hasFrom, hasTo, groups, m_builder);
     path->setIgnored();
     if (priority != kNoPriority)
-        path->setPriority(priority);
+        path->setWrittenPriority(priority);
     if (found)
         store(std::move(path));
     return true;

@@ -66,7 +66,7 @@ bool Tsd_DelayPath::getProp(const char*& name, const char*& value) const {
         TSD_MSG().fatal(2, "Spec %s has no delay data.\n", getTSid());
     if (m_dataPathOnly)
         text += ":DATAPATHONLY";
-    if (hasPriority())
+    if (hasWrittenPriority())
         text += formatString(":PRIORITY:%ld", static_cast<long>(getPriority()));
     return tsd_detail::specPropBuffers().set(getTSid(), text.c_str(), name, value);
 }

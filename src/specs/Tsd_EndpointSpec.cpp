@@ -7,6 +7,7 @@
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
 
+#include <cstring>
 #include <string>
 #include <unordered_set>
 #include <vector>
@@ -38,7 +39,8 @@ Tsd_EndpointSpec::Tsd_EndpointSpec(const char* tsid)
 }
 
 Tsd_EndpointSpec::Tsd_EndpointSpec(const Tsd_EndpointSpec& other)
-    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup) {
+    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup),
+      m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {
     if (other.m_delay != nullptr)
         m_delay = std::make_unique<Tsd_TimeValue>(*other.m_delay);
     if (other.m_link != nullptr)
@@ -157,8 +159,18 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
     if (m_delay != nullptr) {
         buffer.copy(m_delay->getString(":"));
     } else if (m_link != nullptr) {
-        // A pending link writes nothing.
-        buffer.copy(formatLink(m_link.get(), ""));
+        // A pending link writes nothing; a TSid that would not read back as
+        // a link is quoted.
+        const char* text = formatLink(m_link.get(), "");
+        if (text == nullptr) {
+            buffer.clear();
+        } else {
+            std::string written;
+            const char* tsid = m_link->spec->getTSid();
+            tsd_detail::appendLinkTSid(written, tsid);
+            written += text + std::strlen(tsid);
+            buffer.copy(written.c_str());
+        }
     } else {
         return nullptr;
     }
@@ -180,7 +192,7 @@ void Tsd_EndpointSpec::dump(DumpStream& stream, short indent) const {
                  text != nullptr ? std::string("   link: ") + text
                                  : std::string("   link with NULL TSid pointer"));
     }
-    if (hasPriority())
+    if (hasWrittenPriority())
         dumpLine(stream, indent, "   priority: " + std::to_string(m_priority));
     else
         dumpLine(stream, indent, "   priority unset");

@@ -151,7 +151,12 @@ Tsd_PathControl::Tsd_PathControl(const Tsd_PathControl& other)
 Tsd_PathControl::~Tsd_PathControl() = default;
 
 bool Tsd_PathControl::getProp(const char*& name, const char*& value) const {
-    return handOutSpecProp(m_enabled ? "ENABLE" : "DISABLE", orEmpty(getDelayName()), name, value);
+    // The delay name is a name in constraint text like any other; none is
+    // written as nothing.
+    const char* delay = getDelayName();
+    return handOutSpecProp(m_enabled ? "ENABLE" : "DISABLE",
+                           delay != nullptr && *delay != 0 ? Tsd_Util::getAnnoName(delay) : "",
+                           name, value);
 }
 
 void Tsd_PathControl::dump(DumpStream& stream, short indent) const {

@@ -91,7 +91,7 @@ bool Tsd_Period::getProp(const char*& name, const char*& value) const {
     }
     tsd_detail::appendDutyAndJitter(text, m_dutyCycleValue.get(), m_dutyCyclePercent,
                                     m_dutyCycleHigh, m_inputJitter.get());
-    if (hasPriority())
+    if (hasWrittenPriority())
         text += formatString(":PRIORITY:%ld", static_cast<long>(getPriority()));
     return tsd_detail::specPropBuffers().set(getTSid(), text.c_str(), name, value);
 }

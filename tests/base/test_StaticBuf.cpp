@@ -91,17 +91,43 @@ TEST(StaticBuf, DumpStatsReportsStateAsStatusMessages) {
                                   "   length validation: okay\n", "   limit validation: okay\n"}));
 }
 
-TEST(AnnoName, QuotesOnlyNamesThatCannotBeginABareName) {
+// Quoted: a first character that cannot begin a bare name, or a name that
+// would not read back as itself (blanks, separators, quotes, member keywords).
+TEST(AnnoName, QuotesOnlyNamesThatWouldNotReadBack) {
     struct Case {
         const char* name;
         const char* expected;
     };
     const Case cases[] = {
-        {"clk", "clk"},   {"$clk", "$clk"},       {"<clk>", "<clk>"}, {"/top", "/top"},
-        {"9ns", "9ns"},   {"&a", "&a"},           {"_a", "_a"},       {"-a", "-a"},
-        {"a b", "a b"},   {"/", "\"/\""},         {"//x", "\"//x\""}, {"*grp", "\"*grp\""},
-        {".x", "\".x\""}, {" lead", "\" lead\""}, {"\"q", "\"\"q\""}, {"FFS(d*)", "FFS(d*)"},
+        {"clk", "clk"},
+        {"$clk", "$clk"},
+        {"<clk>", "<clk>"},
+        {"/top", "/top"},
+        {"9ns", "9ns"},
+        {"&a", "&a"},
+        {"_a", "_a"},
+        {"-a", "-a"},
+        {"/", "\"/\""},
+        {"//x", "\"//x\""},
+        {"*grp", "\"*grp\""},
+        {".x", "\".x\""},
+        {" lead", "\" lead\""},
+        {"FFS(d*)", "FFS(d*)"},
         {"", "\"\""},
+        {"a b", "\"a b\""},
+        {"both ", "\"both \""},
+        {"a\tb", "\"a\tb\""},
+        {"a:b", "\"a:b\""},
+        {"a=b", "\"a=b\""},
+        {"a;b", "\"a;b\""},
+        {"it's", "\"it's\""},
+        {"\"q", "'\"q'"},
+        {"a\"b'c", "\"a\"\"b'c\""},
+        {"rising", "\"rising\""},
+        {"EXCEPT", "\"EXCEPT\""},
+        {"TRANSHI", "\"TRANSHI\""},
+        {"RISING_1", "RISING_1"},
+        {"FFS(\"x\")", "'FFS(\"x\")'"},
     };
     for (const Case& c : cases)
         EXPECT_STREQ(Tsd_Util::getAnnoName(c.name), c.expected) << "name: " << c.name;

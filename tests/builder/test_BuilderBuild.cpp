@@ -440,6 +440,7 @@ TEST(BuilderBuild, NamesThatNeedQuotesCanBeDefined) {
     MessageCapture errors;
     Tsd_Builder builder;
     builder.addUserGroupProp("x y", "a::b");
+    builder.addUserGroupProp("a\"b'c", "x::y"); // written as "a""b'c"
     builder.addSpecProp("TS 2", "BOGUS:a");
     EXPECT_EQ(builder.buildTSDesign(), nullptr);
     EXPECT_EQ(
@@ -447,6 +448,8 @@ TEST(BuilderBuild, NamesThatNeedQuotesCanBeDefined) {
         (std::vector<std::string>{
             "Processing TIMEGRP definition \"x y=a::b\": Encountered bad token \":\" in "
             "TIMEGRP:\nx y=a::b\n      ^\n",
+            "Processing TIMEGRP definition \"a\"b'c=x::y\": Encountered bad token \":\" in "
+            "TIMEGRP:\na\"b'c=x::y\n        ^\n",
             "Processing TIMESPEC definition \"TS 2=BOGUS:a\": Encountered bad token \"BOGUS\" "
             "in TIMESPEC:\nTS 2=BOGUS:a\n     ^\n"}));
 }

@@ -72,26 +72,101 @@ PropSet corpus() {
     return set;
 }
 
+// Names with blanks, separators, quotes and member keywords in every place a
+// name stands, predefined-group patterns however spelt, and PRIORITY -1 on
+// every spec kind that has a priority.
+PropSet awkwardCorpus() {
+    PropSet set;
+    set.refs = {
+        {"e1", "TS_TNM", "my group"},
+        {"e2", "TS_TNM", "a:b=c;d"},
+        {"e3", "TS_TNM", "say \"hi\""},
+        {"e4", "TS_TNM", "it's \"x\""},
+        {"e5", "TS_TNM", "RISING"},
+        {"e6", "TS_TNM", "FFS(data*)"},
+        {"e7", "TS_TNM", "pads(A<*>)"},
+        {"e8", "TS_TNM", "FFS(a b)"},
+        {"t1", "TS_TPTHRU", "thru 1"},
+        {"t2", "TS_TPTHRU", "thru\"2"},
+        {"c1", "TS_CLKGRP", "clk a"},
+        {"c2", "TS_CLKGRP", "clk'b"},
+        {"c3", "TS_CLKGRP", "fb:net"},
+        {"n1", "TS_FEEDBACK", "1 ns NET \"fb:net\""},
+        {"n2", "TS_OFFSET", "IN 1 ns BEFORE 'clk a' TIMEGRP \"my group\""},
+    };
+    set.groups = {
+        {"both ", "\"my group\" FALLING \"a:b=c;d\" EXCEPT 'say \"hi\"'"},
+        {"my grp", "\"RISING\" \"both \" \"it's \"\"x\"\"\""},
+        {"q\"g", "pads (\"A<*>\") EXCEPT FFS (\"data*\")"},
+    };
+    set.specs = {
+        {"TS01", "FROM \"both \" THRU \"thru 1\" THRU 'thru\"2' TO \"my grp\" 5 ns PRIORITY -1"},
+        {"TS02", "PERIOD \"a:b=c;d\" 10 ns HIGH 50% PRIORITY -1"},
+        {"TS03", "FROM FFS(\"data*\") TO 'q\"g' TIG PRIORITY -1"},
+        {"TS04", "FROM FFS (data*) TO \"it's \"\"x\"\"\" TS02 * 2 PRIORITY -1"},
+        {"TS05", "PERIOD FFS('a b') TS02 / 2 PRIORITY -1"},
+        {"TS 6", "THRU \"thru 1\" TO pads (\"A<*>\") 1 ns"},
+        {"TS07", "FROM \"my group\" TO \"both \" \"TS 6\" / 4"},
+        {"OFFSET", "IN 2 ns BEFORE \"clk a\" TIMEGRP \"both \" REFERENCE_PIN \"fb:net\""},
+        {"TS_G",
+         "TIMEGRP FFS (\"a b\") OFFSET = OUT 1 ns AFTER \"clk'b\" TIMEGRP \"RISING\" RISING"},
+        {"ENABLE", "\"reg sr:o\""},
+    };
+    return set;
+}
+
 } // namespace
 
 TEST(RoundTrip, EveryFormReadsBackToTheSameText) {
+    for (PropSet input : {corpus(), awkwardCorpus()}) {
+        MessageCapture capture;
+        Built first = build(input);
+        ASSERT_NE(first.design, nullptr) << capture.sink.transcript();
+        EXPECT_TRUE(first.refused.empty());
+        PropSet written = first.writeBack();
+
+        Built second = build(written);
+        ASSERT_NE(second.design, nullptr) << capture.sink.transcript() << written;
+        PropSet rewritten = second.writeBack();
+        EXPECT_EQ(written, rewritten);
+        EXPECT_EQ(capture.sink.errors(), std::vector<std::string>{});
+
+        // Everything came back: every group, spec and reference.
+        EXPECT_EQ(written.groups.size(), input.groups.size());
+        EXPECT_EQ(written.specs.size(), input.specs.size());
+        EXPECT_EQ(written.refs.size(), input.refs.size());
+    }
+}
+
+TEST(RoundTrip, AwkwardNamesAreQuotedAndPatternsCanonical) {
     MessageCapture capture;
-    PropSet input = corpus();
-    Built first = build(input);
-    ASSERT_NE(first.design, nullptr) << capture.sink.transcript();
-    EXPECT_TRUE(first.refused.empty());
-    PropSet written = first.writeBack();
-
-    Built second = build(written);
-    ASSERT_NE(second.design, nullptr) << capture.sink.transcript() << written;
-    PropSet rewritten = second.writeBack();
-    EXPECT_EQ(written, rewritten);
-    EXPECT_EQ(capture.sink.errors(), std::vector<std::string>{});
-
-    // Everything came back: every group, spec and reference.
-    EXPECT_EQ(written.groups.size(), input.groups.size());
-    EXPECT_EQ(written.specs.size(), input.specs.size());
-    EXPECT_EQ(written.refs.size(), input.refs.size());
+    Built built = build(awkwardCorpus());
+    ASSERT_NE(built.design, nullptr) << capture.sink.transcript();
+    PropSet written = built.writeBack();
+    using P = std::pair<std::string, std::string>;
+    EXPECT_EQ(written.groups,
+              (std::vector<P>{{"both ", "\"my group\":FALLING:\"a:b=c;d\":EXCEPT:'say \"hi\"'"},
+                              {"my grp", "\"RISING\":\"both \":\"it's \"\"x\"\"\""},
+                              {"q\"g", "pads(A<*>):EXCEPT:FFS(data*)"}}));
+    EXPECT_EQ(
+        written.specs,
+        (std::vector<P>{
+            {"TS01",
+             "FROM:\"both \":THRU:\"thru 1\":THRU:'thru\"2':TO:\"my grp\":5000:pS:PRIORITY:-1"},
+            {"TS02", "PERIOD:\"a:b=c;d\":10000:pS:HIGH:50%:PRIORITY:-1"},
+            {"TS03", "FROM:FFS(data*):TO:'q\"g':TIG:PRIORITY:-1"},
+            {"TS04", "FROM:FFS(data*):TO:\"it's \"\"x\"\"\":TS02*2:PRIORITY:-1"},
+            {"TS05", "PERIOD:\"FFS(a b)\":TS02/2:PRIORITY:-1"},
+            {"TS 6", "THRU:\"thru 1\":TO:pads(A<*>):1000:pS"},
+            {"TS07", "FROM:\"my group\":TO:\"both \":\"TS 6\"/4"},
+            {"OFFSET", "IN:2000:pS:BEFORE:\"clk a\":REFERENCE_PIN:\"fb:net\":TIMEGRP:\"both \""},
+            {"TS_GROUP_BASED_OFFSET",
+             "TIMEGRP:\"FFS(a b)\":OFFSET=OUT:1000:pS:AFTER:\"clk'b\":TIMEGRP:\"RISING\":RISING"},
+            {"ENABLE", "\"reg sr:o\""}}));
+    EXPECT_EQ(written.refs[13], (tsd_test::RefProp{"n1", "TS_FEEDBACK", "1000:pS:NET:\"fb:net\""}));
+    EXPECT_EQ(
+        written.refs[14],
+        (tsd_test::RefProp{"n2", "TS_OFFSET", "IN:1000:pS:BEFORE:\"clk a\":TIMEGRP:\"my group\""}));
 }
 
 TEST(RoundTrip, CanonicalTextOfEachForm) {

@@ -166,6 +166,63 @@ TEST(LogicalParser, NamesAreReadByPosition) {
     });
 }
 
+// A predefined-group pattern is one name wherever a group name stands,
+// however it is spelt: quoted parts inside the parentheses and blanks
+// before "(" are dropped from the name.
+TEST(LogicalParser, PatternsAreOneNameInEveryPosition) {
+    struct Spelling {
+        const char* text;
+        const char* name;
+    };
+    const Spelling spellings[] = {
+        {"FFS(data*)", "FFS(data*)"},
+        {"FFS(\"data*\")", "FFS(data*)"},
+        {"FFS('data*')", "FFS(data*)"},
+        {"FFS (\"data*\")", "FFS(data*)"},
+        {"ffs \t (data*)", "ffs(data*)"},
+        {"pads(\"A<*>\")", "pads(A<*>)"},
+        {"RAMS (\"*i_huffman*\")", "RAMS(*i_huffman*)"},
+        {"LATCHES(top/\"a b\"/*)", "LATCHES(top/a b/*)"},
+        {"PPS(\"x\"\"y\")", "PPS(x\"y)"},
+        {"Pads('a:b;c=d')", "Pads(a:b;c=d)"},
+    };
+    struct Position {
+        const char* text; // "@" stands for the spelling
+        const char* call; // "@" stands for the name
+    };
+    const Position positions[] = {
+        {"TIMEGRP A=@ ;", "TIMEGRP A in=[@] ex=[]"},
+        {"TIMEGRP A = x RISING @ @ EXCEPT @ ;", "TIMEGRP A in=[x,RISING @,@] ex=[@]"},
+        {"TIMESPEC TS1 = FROM @ THRU @ TO @ 5 ns ;",
+         "MAXDELAY TS1 from=1 to=1 [@,@,@] value=5000ps prio=- dpo=0"},
+        {"TIMESPEC TS1 = FROM @ TO @ TIG ;", "TIG TS1 from=1 to=1 [@,@] prio=-"},
+        {"TIMESPEC TS1 = PERIOD @ 10 ns ;",
+         "PERIOD TS1 group=@ value=10000ps phase=+0 duty=HIGH/0/0% jitter=- prio=-"},
+        {"TIMEGRP @ OFFSET = IN 2 ns BEFORE clk TIMEGRP @ ;",
+         "TROFFSET pad=@ IN 2000 valid=- BEFORE clk hl=(null) reg=@"},
+        {"OFFSET = OUT 2 ns AFTER @ TIMEGRP @ ;",
+         "ROFFSET OUT 2000 valid=- AFTER @ hl=(null) reg=@"},
+    };
+    auto fill = [](std::string form, const char* with) {
+        for (std::size_t at = form.find('@'); at != std::string::npos; at = form.find('@', at))
+            form.replace(at, 1, with), at += std::strlen(with);
+        return form;
+    };
+    RecordingLogicalParser p;
+    for (const Spelling& s : spellings)
+        for (const Position& at : positions) {
+            const std::string text = fill(at.text, s.text);
+            EXPECT_EQ(parseOne(p, text.c_str()), fill(at.call, s.name)) << text;
+        }
+    // Only the five keywords form patterns, and only "(" after blanks joins.
+    expectForms({
+        {"TIMEGRP A = rams (x) FFSX (y) ;", "TIMEGRP A in=[rams(x),FFSX,(y)] ex=[]"},
+        {"TIMEGRP A = FFS:(x) FFS x ;", "TIMEGRP A in=[FFS,(x),FFS,x] ex=[]"},
+        {"TIMEGRP A = FFS(a)b FFS(a(b)\"c\") ;", "TIMEGRP A in=[FFS(a)b,FFS(a(b)c)] ex=[]"},
+        {"TIMEGRP A = \"a\"\"b\" 'it''s' ;", "TIMEGRP A in=[a\"b,it's] ex=[]"},
+    });
+}
+
 // Different spellings of one constraint give the same callback arguments.
 TEST(LogicalParser, SpellingsOfOneConstraintAgree) {
     const std::vector<std::vector<const char*>> groups = {
@@ -312,6 +369,9 @@ TEST(LogicalParser, SyntaxErrorsReportTokenAndColumn) {
         {"TIMEGRP A=\"b\x7f\" ;", CONSTRAINT_ERR_INVALID_CHARACTER, 13, "\x7f"},
         {"TIMEGRP A=\"b\"c ;", CONSTRAINT_ERR_MISSING_SEPARATOR, 14, "c"},
         {"TIMEGRP A=b\"c\" ;", CONSTRAINT_ERR_MISSING_SEPARATOR, 12, "\"c\""},
+        {"TIMEGRP A=FFS(\"b ;", CONSTRAINT_ERR_UNBALANCED_QUOTE, 15, "\"b ;"},
+        {"TIMEGRP A=FFS(\"b\x01\") ;", CONSTRAINT_ERR_INVALID_CHARACTER, 17, "\x01"},
+        {"TIMEGRP A=FFS(b)\"c\" ;", CONSTRAINT_ERR_MISSING_SEPARATOR, 17, "\"c\""},
         // separators where none may stand
         {":TIMESPEC TS01=TIG ;", CONSTRAINT_ERR_STRAY_SEPARATOR, 1, ":"},
         {"TIMESPEC TS01=PERIOD::clk:10:nS ;", CONSTRAINT_ERR_STRAY_SEPARATOR, 22, ":"},

@@ -45,6 +45,8 @@ TEST(NetParser, Forms) {
         {"OFFSET = OUT 3 AFTER \"clk a\" LOW ;",
          "OFFSET OUT 3000 valid=- AFTER clk a hl=LOW reg=(null)"},
         {"Feedback = -1.5 ns net clkfb ;", "PORTPAIR FEEDBACK -1500 kind=net group=clkfb"},
+        {"OFFSET = IN 2 BEFORE clk TIMEGRP FFS (\"a b\") ;",
+         "OFFSET IN 2000 valid=- BEFORE clk hl=(null) reg=FFS(a b)"},
         // any word stands as the port-pair kind; the adaptor judges it
         {"FEEDBACK = 1 ns PIN clkfb ;", "PORTPAIR FEEDBACK 1000 kind=PIN group=clkfb"},
     };

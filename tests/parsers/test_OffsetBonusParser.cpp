@@ -42,6 +42,13 @@ TEST(OffsetBonusParser, ReducesOnlyTextsWithSpecialFeatures) {
          "", Tsd_UserGroup::EDGE_RISING, true},
         {"OFFSET = IN 2 ns BEFORE \"a=b\" RISING ;", true, "OFFSET=IN:2:ns:BEFORE:\"a=b\": ;", "",
          Tsd_UserGroup::EDGE_RISING, true},
+        // Patterns stay one token, as the parsers read them; a token that
+        // holds a double quote is written in single quotes.
+        {"TIMEGRP pads (\"A<*>\") OFFSET = IN 2 ns BEFORE clk TIMEGRP FFS('a b') RISING ;", true,
+         "TIMEGRP:pads(A<*>):OFFSET=IN:2:ns:BEFORE:clk:TIMEGRP:\"FFS(a b)\": ;", "",
+         Tsd_UserGroup::EDGE_RISING, true},
+        {"OFFSET = IN 2 ns BEFORE \"a\"\"b\" REFERENCE_PIN 'p\"' ;", true,
+         "OFFSET=IN:2:ns:BEFORE:'a\"b': ;", "p\"", Tsd_UserGroup::EDGE_ANY, true},
         // Nothing special: parsed as given.
         {"OFFSET = IN 2 ns BEFORE clk ;", false, "", "", Tsd_UserGroup::EDGE_ANY, true},
         {"TIMESPEC TS01=FROM:a:TO:b:10:nS ;", false, "", "", Tsd_UserGroup::EDGE_ANY, true},

@@ -173,3 +173,32 @@ TEST(EndpointSpec, CopiesAndDump) {
     EXPECT_NE(tsd_test::dumpText(copy).find("\n      link with NULL TSid pointer\n"),
               std::string::npos);
 }
+
+// -1 is "no priority" to callers; written as -1 in the text, it is kept for
+// the written text and the dump, and forgotten by setPriority/clearPriority.
+TEST(EndpointSpec, PriorityWrittenAsMinusOne) {
+    Tsd_DelayPath path("TS01");
+    path.setDelayValue(TV(1, TV::UNITS_NS));
+    path.setWrittenPriority(-1);
+    EXPECT_FALSE(path.hasPriority());
+    EXPECT_EQ(path.getPriority(), -1);
+    EXPECT_TRUE(path.hasWrittenPriority());
+    Tsd_DelayPath copy(path);
+    EXPECT_NE(tsd_test::dumpText(copy).find("\n      priority: -1\n"), std::string::npos);
+
+    const struct {
+        void (*change)(Tsd_DelayPath&);
+        bool written;
+    } cases[] = {
+        {[](Tsd_DelayPath& p) { p.setPriority(-1); }, false},
+        {[](Tsd_DelayPath& p) { p.clearPriority(); }, false},
+        {[](Tsd_DelayPath& p) { p.setWrittenPriority(4); }, true},
+        {[](Tsd_DelayPath& p) { p.setPriority(0); }, true},
+    };
+    for (const auto& c : cases) {
+        Tsd_DelayPath p(copy);
+        c.change(p);
+        EXPECT_EQ(p.hasWrittenPriority(), c.written);
+        EXPECT_EQ(p.hasPriority(), p.getPriority() != -1);
+    }
+}

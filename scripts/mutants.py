@@ -1,0 +1,109 @@
+#!/usr/bin/env python3
+"""Breaks the code on purpose, one fault at a time, and tells whether the
+test suite notices each one.
+
+usage: mutants.py [--list FILE] [--build DIR] [NAME ...]
+
+The faults are listed in tests/mutants.txt, one block each:
+
+    == name: what the fault does
+    file: src/base/Tsd_Lists.cpp
+    - text as it stands in the file (must occur exactly once)
+    + the text that replaces it
+
+Every fault is applied to a clean copy of its file, the tests are rebuilt in
+their own build folder and run until the first failure; the file is then put
+back. A fault is "caught" when a test fails or the build breaks on a test
+(a fault that breaks the library's own build is reported as such).
+"""
+import argparse
+import os
+import subprocess
+import sys
+
+ROOT = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
+
+
+def parse(path):
+    faults, cur = [], None
+    with open(path) as f:
+        for raw in f:
+            line = raw.rstrip("\n")
+            if line.startswith("=="):
+                name, _, what = line[2:].strip().partition(":")
+                cur = {"name": name.strip(), "what": what.strip(), "old": [], "new": []}
+                faults.append(cur)
+            elif cur is None or line.startswith("#") or not line.strip():
+                continue
+            elif line.startswith("file:"):
+                cur["file"] = line[5:].strip()
+            elif line.startswith("- "):
+                cur["old"].append(line[2:])
+            elif line.startswith("+ ") or line == "+":
+                cur["new"].append(line[2:])
+    for fault in faults:
+        fault["old"] = "\n".join(fault["old"])
+        fault["new"] = "\n".join(fault["new"])
+    return faults
+
+
+def run(cmd, **kw):
+    return subprocess.run(cmd, cwd=ROOT, stdout=subprocess.PIPE, stderr=subprocess.STDOUT,
+                          text=True, **kw)
+
+
+def main():
+    ap = argparse.ArgumentParser()
+    ap.add_argument("--list", default=os.path.join(ROOT, "tests", "mutants.txt"))
+    ap.add_argument("--build", default="build/mutants")
+    ap.add_argument("names", nargs="*")
+    args = ap.parse_args()
+
+    faults = parse(args.list)
+    if args.names:
+        faults = [f for f in faults if f["name"] in args.names]
+    if not os.path.exists(os.path.join(ROOT, args.build, "build.ninja")):
+        r = run(["cmake", "-S", ".", "-B", args.build, "-G", "Ninja",
+                 "-DCMAKE_BUILD_TYPE=Release", "-DTSD_BUILD_EXAMPLES=OFF",
+                 "-DTSD_WARNINGS_AS_ERRORS=OFF"])
+        if r.returncode != 0:
+            print(r.stdout)
+            return 2
+    r = run(["cmake", "--build", args.build])
+    if r.returncode != 0:
+        print(r.stdout)
+        print("the unchanged code does not build")
+        return 2
+
+    caught = 0
+    for fault in faults:
+        path = os.path.join(ROOT, fault["file"])
+        with open(path) as f:
+            original = f.read()
+        if original.count(fault["old"]) != 1:
+            print(f"{fault['name']:<28} NOT APPLIED: the text occurs "
+                  f"{original.count(fault['old'])} times in {fault['file']}")
+            continue
+        try:
+            with open(path, "w") as f:
+                f.write(original.replace(fault["old"], fault["new"]))
+            b = run(["cmake", "--build", args.build])
+            if b.returncode != 0:
+                verdict = "caught (build)"
+            else:
+                t = run(["ctest", "--test-dir", args.build, "-j2", "--stop-on-failure",
+                         "-E", "install-consumer|bench_smoke"])
+                verdict = "caught" if t.returncode != 0 else "MISSED"
+        finally:
+            with open(path, "w") as f:
+                f.write(original)
+        if verdict.startswith("caught"):
+            caught += 1
+        print(f"{fault['name']:<28} {verdict:<15} {fault['what']}", flush=True)
+    run(["cmake", "--build", args.build])
+    print(f"{caught} of {len(faults)} faults caught")
+    return 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
