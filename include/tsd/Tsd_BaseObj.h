@@ -77,6 +77,8 @@ public:
     void setFirst(const void* p, std::int32_t slot);
     // The first slot holding p, or -1.
     std::int32_t first(const void* p) const;
+    // Room for n pointers without growing again.
+    void reserve(std::size_t n);
 
 private:
     struct Entry {
@@ -85,7 +87,7 @@ private:
         std::int32_t count;
     };
     std::size_t probe(const void* p) const;
-    void grow();
+    void rehash(std::size_t size);
 
     std::vector<Entry> m_table; // open addressing; a null key is a free entry
     std::size_t m_used = 0;
@@ -101,10 +103,9 @@ private:
 template <class T>
 class Tsd_DArray {
 public:
-    explicit Tsd_DArray(int initialCapacity = 10) {
-        if (initialCapacity > 0)
-            m_slots.reserve(static_cast<std::size_t>(initialCapacity));
-    }
+    // The storage is allocated on the first append, not here: most lists of
+    // a large design hold one or two pointers, or none.
+    explicit Tsd_DArray(int /*initialCapacity*/ = 10) {}
     Tsd_DArray(const Tsd_DArray& other) : m_slots(other.m_slots), m_live(other.m_live) {}
     Tsd_DArray& operator=(const Tsd_DArray& other) {
         if (this != &other) {
@@ -208,6 +209,7 @@ private:
 
     void buildIndex() const {
         m_index = std::make_unique<Tsd_SlotIndex>();
+        m_index->reserve(static_cast<std::size_t>(m_live));
         for (int i = 0; i < getCount(); ++i)
             if (T* p = m_slots[static_cast<std::size_t>(i)])
                 m_index->add(p, i);

@@ -85,7 +85,7 @@ protected:
     // The prefix of parse messages (a "%z" argument); null sets it empty.
     void setContext(std::unique_ptr<char16_t[]> context);
     void setContext(const char16_t* context);
-    const char16_t* getContext() const { return m_context.c_str(); }
+    const char16_t* getContext() const;
 
     // Add to the counters; they stop at their largest and smallest values.
     void addError(short n);
@@ -130,7 +130,11 @@ private:
     std::unique_ptr<Tsd_Design> m_ownedDesign;
     std::unique_ptr<Tsd_SpecGroupParser> m_specGroupParser;
     std::unique_ptr<Tsd_NetParser> m_netParser;
-    std::u16string m_context;
+    // The context, made from m_contextFormat and m_contextProp when it is
+    // first asked for: most properties never need theirs.
+    mutable std::u16string m_context;
+    mutable const char* m_contextFormat = nullptr;
+    const Tsd_Prop* m_contextProp = nullptr;
     std::unique_ptr<char16_t[]> m_objUserId;
     short m_numError = 0;
     short m_numWarning = 0;

@@ -130,19 +130,27 @@ std::size_t Tsd_SlotIndex::probe(const void* p) const {
     return i;
 }
 
-void Tsd_SlotIndex::grow() {
+void Tsd_SlotIndex::rehash(std::size_t size) {
     std::vector<Entry> old;
     old.swap(m_table);
-    m_table.assign(old.empty() ? 64 : old.size() * 2, Entry{nullptr, -1, 0});
+    m_table.assign(size, Entry{nullptr, -1, 0});
     for (const Entry& entry : old)
         if (entry.key != nullptr)
             m_table[probe(entry.key)] = entry;
 }
 
+void Tsd_SlotIndex::reserve(std::size_t n) {
+    std::size_t size = 64;
+    while (size < 2 * (n + 1))
+        size *= 2;
+    if (size > m_table.size())
+        rehash(size);
+}
+
 void Tsd_SlotIndex::add(const void* p, std::int32_t slot) {
     // At most half full, so probes stay short.
     if (2 * (m_used + 1) > m_table.size())
-        grow();
+        rehash(m_table.empty() ? 64 : m_table.size() * 2);
     Entry& entry = m_table[probe(p)];
     if (entry.key == nullptr) {
         entry = Entry{p, slot, 1};

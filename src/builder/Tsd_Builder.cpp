@@ -112,10 +112,24 @@ void Tsd_Builder::setContext(std::unique_ptr<char16_t[]> context) {
 }
 
 void Tsd_Builder::setContext(const char16_t* context) {
+    m_contextFormat = nullptr;
     if (context == nullptr)
         m_context.clear();
     else
         m_context = context;
+}
+
+const char16_t* Tsd_Builder::getContext() const {
+    if (m_contextFormat != nullptr) {
+        std::unique_ptr<char16_t[]> context = translateMessage(
+            "TSDatabase", m_contextFormat, m_contextProp->name.get(), m_contextProp->value.get());
+        m_contextFormat = nullptr;
+        if (context == nullptr)
+            m_context.clear();
+        else
+            m_context = context.get();
+    }
+    return m_context.c_str();
 }
 
 void Tsd_Builder::addError(short n) {

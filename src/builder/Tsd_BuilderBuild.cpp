@@ -112,8 +112,9 @@ public:
     int check(Tsd_EndpointSpec* spec) const {
         if (spec->hasDelayValue() || spec->isIgnored())
             return 0;
+        // Only linked specs are in the graph.
         const int id = m_graph.idOf(spec);
-        const int next = m_graph.next(id);
+        const int next = id >= 0 ? m_graph.next(id) : -1;
         const End end = next >= 0 ? m_end[static_cast<std::size_t>(next)] : MISSING;
         if (end == MISSING || end == CIRCLE)
             return spec->checkLink(true);
@@ -195,8 +196,11 @@ void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
         return;
     // Each message names the definition it comes from through the context.
     for (std::unique_ptr<Tsd_Prop>& prop : *props) {
-        setContext(translateMessage("TSDatabase", context, prop->name.get(), prop->value.get()));
+        // The context is made when a message first asks for it.
+        m_contextFormat = context;
+        m_contextProp = prop.get();
         (this->*process)(prop->name.get(), prop->value.get());
+        m_contextFormat = nullptr;
         prop.reset();
     }
     props.reset();

@@ -66,8 +66,7 @@ std::vector<const Tsd_PredefGroup*> trashedMembers(const Tsd_UserGroup* group, b
 // cycle never meet a frozen spec, so their outcome is fixed and memoised.
 class LinkFreezer {
 public:
-    LinkFreezer(const Tsd_BaseObjList& specs, const Tsd_BaseObjList& trash)
-        : m_graph(specs), m_values(static_cast<std::size_t>(m_graph.size())) {
+    LinkFreezer(const Tsd_BaseObjList& specs, const Tsd_BaseObjList& trash) : m_graph(specs) {
         const auto n = static_cast<std::size_t>(m_graph.size());
         m_root.assign(n, -1);
         m_zero.assign(n, 0);
@@ -121,9 +120,9 @@ public:
     bool visit(Tsd_EndpointSpec* spec) {
         if (spec->hasDelayValue())
             return true;
+        // Only linked specs are in the graph.
         const int id = m_graph.idOf(spec);
-        const int next = m_graph.next(id);
-        const auto i = static_cast<std::size_t>(id);
+        const int next = id >= 0 ? m_graph.next(id) : -1;
         if (next < 0) {
             // Nothing to follow: fine for an ignored spec, else the link
             // check ends in its fatal message.
@@ -131,6 +130,7 @@ public:
                 spec->checkLink(false);
             return true;
         }
+        const auto i = static_cast<std::size_t>(id);
         const auto j = static_cast<std::size_t>(next);
         if (m_root[i] < 0) {
             // The chain never reaches a delay, and nothing on it is frozen.
@@ -291,6 +291,8 @@ private:
     // The delay that getDelayValue() gives: the same operations in the same
     // order, each link applied to the value of the spec it links to.
     Tsd_TimeValue value(int id) {
+        if (m_values.empty())
+            m_values.resize(static_cast<std::size_t>(m_graph.size()));
         std::vector<int> pending;
         int x = id;
         while (!m_haveValue[static_cast<std::size_t>(x)] && !m_graph.spec(x)->hasDelayValue()) {

@@ -11,7 +11,6 @@
 #include <algorithm>
 #include <functional>
 #include <string>
-#include <unordered_set>
 #include <vector>
 
 using tsd_detail::dumpLine;
@@ -214,10 +213,10 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleFreeGroups
     // circle. A group whose walk found no circle reaches no circle at all,
     // whatever the route to it, so later routes (and later searches) skip
     // it: that keeps sound definitions linear and changes no count.
-    if (circleFree.count(start) != 0)
+    if (circleFree.contains(start))
         return 0;
     int count = 0;
-    std::unordered_set<const Tsd_UserGroup*> onRoute;
+    tsd_detail::PointerSet onRoute;
     std::vector<Frame> route;
     route.emplace_back(start, count);
     onRoute.insert(start);
@@ -231,9 +230,9 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleFreeGroups
             continue;
         }
         Tsd_UserGroup* user = member->getUserGroup();
-        if (user == nullptr || circleFree.count(user) != 0)
+        if (user == nullptr || circleFree.contains(user))
             continue;
-        if (onRoute.count(user) != 0) {
+        if (onRoute.contains(user)) {
             ++count;
             if (report)
                 reportCircle(route);

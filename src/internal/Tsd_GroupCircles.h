@@ -2,16 +2,15 @@
 // check and the builder's check of every user group.
 #pragma once
 
+#include "internal/Tsd_PointerSet.h"
 #include "tsd/Tsd_Groups.h"
-
-#include <unordered_set>
 
 namespace tsd_detail {
 
 // User groups known to reach no circular definition. Whether a group does
 // depends only on the definitions, not on where a search began, so one set
 // serves every search over unchanged definitions.
-using CircleFreeGroups = std::unordered_set<const Tsd_UserGroup*>;
+using CircleFreeGroups = PointerSet;
 
 // What checkInExcludes(report) counts and reports for `start`, skipping (and
 // adding to) the groups of `circleFree`.

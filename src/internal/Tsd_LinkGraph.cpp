@@ -5,12 +5,16 @@
 namespace tsd_detail {
 
 LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
-    // Number every spec reachable from the list, following each chain only
-    // as far as the first spec already numbered.
+    // Number every linked spec of the list and every spec its chain reaches,
+    // following each chain only as far as the first spec already numbered.
+    m_ids.reserve(static_cast<std::size_t>(list.getCount()));
     for (int i = 0; i < list.getCount(); ++i) {
         Tsd_BaseObj* obj = list.getAt(i);
         Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr;
-        while (spec != nullptr && m_ids.emplace(spec, size()).second) {
+        if (spec == nullptr || !spec->isLinked())
+            continue;
+        while (spec != nullptr && m_ids.first(spec) < 0) {
+            m_ids.add(spec, size());
             m_specs.push_back(spec);
             spec = spec->getLinkedSpec();
         }
@@ -18,7 +22,7 @@ LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
     m_next.resize(m_specs.size());
     for (int id = 0; id < size(); ++id) {
         Tsd_EndpointSpec* linked = spec(id)->getLinkedSpec();
-        m_next[static_cast<std::size_t>(id)] = linked != nullptr ? m_ids.at(linked) : -1;
+        m_next[static_cast<std::size_t>(id)] = linked != nullptr ? m_ids.first(linked) : -1;
     }
 
     // Walk each chain from its first unvisited node; a walk that comes back
@@ -57,8 +61,7 @@ LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
 }
 
 int LinkGraph::idOf(const Tsd_EndpointSpec* spec) const {
-    auto it = m_ids.find(spec);
-    return it != m_ids.end() ? it->second : -1;
+    return m_ids.first(spec);
 }
 
 std::vector<int> LinkGraph::cycleNodes(int c) const {

@@ -6,7 +6,6 @@
 #include "tsd/Tsd_BaseObj.h"
 #include "tsd/Tsd_Specs.h"
 
-#include <unordered_map>
 #include <vector>
 
 namespace tsd_detail {
@@ -17,8 +16,8 @@ namespace tsd_detail {
 // checks share the walks.
 class LinkGraph {
 public:
-    // The endpoint specs of `list` (other objects are passed over) and every
-    // spec their links reach.
+    // The linked endpoint specs of `list` (other objects are passed over)
+    // and every spec their links reach.
     explicit LinkGraph(const Tsd_BaseObjList& list);
 
     int size() const { return static_cast<int>(m_specs.size()); }
@@ -43,7 +42,7 @@ public:
 
 private:
     std::vector<Tsd_EndpointSpec*> m_specs;
-    std::unordered_map<const Tsd_EndpointSpec*, int> m_ids;
+    Tsd_SlotIndex m_ids; // the node of each spec, as its "slot"
     std::vector<int> m_next;
     std::vector<int> m_cycleOf;
     std::vector<int> m_cycleStart{0}; // cycle c is m_cycleNodes[start[c], start[c+1])

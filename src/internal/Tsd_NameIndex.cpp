@@ -41,7 +41,16 @@ bool NameIndex::headMatches(const Tsd_BaseObjList& list, const Bucket& bucket,
     return name != nullptr && std::strcmp(name, key) == 0;
 }
 
-void NameIndex::rehash(std::size_t size) {
+void NameIndex::rehash() {
+    // Sized for the keys still held: buckets whose slots were all cleared
+    // are dropped here, so a list that keeps clearing and appending does
+    // not grow its table.
+    std::size_t live = 1;
+    for (const Bucket& bucket : m_table)
+        live += bucket.head >= 0 ? 1 : 0;
+    std::size_t size = 16;
+    while (size < 8 * live)
+        size *= 2;
     std::vector<Bucket> old;
     old.swap(m_table);
     m_table.assign(size, Bucket{0, kFree, kFree});
@@ -61,7 +70,7 @@ void NameIndex::rehash(std::size_t size) {
 void NameIndex::insert(const Tsd_BaseObjList& list, std::int32_t slot, const char* key) {
     // At most half the buckets taken, counting those whose slots are gone.
     if (2 * (m_taken + 1) > m_table.size())
-        rehash(m_table.empty() ? 16 : m_table.size() * 2);
+        rehash();
     const std::uint32_t hash = hashKey(key);
     const std::size_t mask = m_table.size() - 1;
     std::size_t i = hash & mask;

@@ -49,7 +49,7 @@ private:
     // Skips the cleared slots at the head of a chain; false when none is left.
     bool liveHead(const Tsd_BaseObjList& list, Bucket& bucket);
     bool headMatches(const Tsd_BaseObjList& list, const Bucket& bucket, const char* key) const;
-    void rehash(std::size_t size);
+    void rehash();
 
     KeyOf m_keyOf;
     bool m_built = false;
