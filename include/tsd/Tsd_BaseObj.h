@@ -117,7 +117,16 @@ public:
         return *this;
     }
     Tsd_DArray(Tsd_DArray&&) noexcept = default;
-    Tsd_DArray& operator=(Tsd_DArray&&) noexcept = default;
+    Tsd_DArray& operator=(Tsd_DArray&& other) noexcept {
+        m_slots = std::move(other.m_slots);
+        m_live = other.m_live;
+        m_index = std::move(other.m_index);
+        ++m_shape;
+        other.m_slots.clear();
+        other.m_live = 0;
+        ++other.m_shape;
+        return *this;
+    }
     ~Tsd_DArray() = default;
 
     int getCount() const { return static_cast<int>(m_slots.size()); }

@@ -78,8 +78,16 @@ void Tsd_RefList::deleteAllRefs() {
     for (int i = 0; i < getCount(); ++i)
         if (Tsd_Ref* ref = getAt(i))
             refs.push_back(ref);
+    tsd_detail::FirstSeen<Tsd_Ref> firstSeen(refs);
+    for (int i = 0; i < getCount(); ++i) {
+        Tsd_Ref* ref = getAt(i);
+        if (ref == nullptr)
+            continue;
+        setAt(i, nullptr);
+        if (firstSeen(ref))
+            delete ref;
+    }
     reset(0);
-    tsd_detail::forEachOnce(refs, [](Tsd_Ref* ref) { delete ref; });
 }
 
 bool Tsd_BaseObjList::addObj(Tsd_BaseObj* obj) {

@@ -210,11 +210,11 @@ void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
 void Tsd_Builder::validateUserGroups() {
     // What one group's check learns about groups free of circles saves the
     // checks of the others from walking them again.
-    tsd_detail::CircleFreeGroups circleFree;
+    tsd_detail::CircleSearchState state;
     Tsd_BaseObjListIter iter(design().getGroupList());
     while (Tsd_BaseObj* obj = iter.next())
         if (Tsd_UserGroup* group = obj->getUserGroup())
-            addErrorCount(tsd_detail::countCircles(group, true, circleFree));
+            addErrorCount(tsd_detail::countCircles(group, true, state));
 }
 
 void Tsd_Builder::resolvePendingOffsets() {

@@ -75,7 +75,10 @@ Tsd_Design::~Tsd_Design() {
             for (int i = 0; i < list->getCount(); ++i)
                 if (Tsd_BaseObj* obj = list->getAt(i))
                     objects.push_back(obj);
-    tsd_detail::forEachOnce(objects, [](Tsd_BaseObj* obj) { delete obj; });
+    tsd_detail::FirstSeen<Tsd_BaseObj> firstSeen(objects);
+    for (Tsd_BaseObj* obj : objects)
+        if (firstSeen(obj))
+            delete obj;
 }
 
 bool Tsd_Design::moveToTrash(ListPair& pair, Tsd_BaseObj* obj) {

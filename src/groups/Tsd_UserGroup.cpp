@@ -206,47 +206,44 @@ void reportCircle(const std::vector<Frame>& route) {
 
 } // namespace
 
-int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleFreeGroups& circleFree) {
+int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchState& state) {
     // A depth-first walk over every route from the group, with an explicit
     // stack so that a long chain of definitions cannot exhaust the call
     // stack. Each route that comes back to a group already on it is one
     // circle. A group whose walk found no circle reaches no circle at all,
     // whatever the route to it, so later routes (and later searches) skip
     // it: that keeps sound definitions linear and changes no count.
-    if (circleFree.contains(start))
+    if (state.isFree(start))
         return 0;
     int count = 0;
-    tsd_detail::PointerSet onRoute;
     std::vector<Frame> route;
     route.emplace_back(start, count);
-    onRoute.insert(start);
+    state.enterRoute(start);
     while (!route.empty()) {
         Tsd_PredefGroup* member = route.back().nextMember();
         if (member == nullptr) {
-            if (count == route.back().countOnEntry)
-                circleFree.insert(route.back().group);
-            onRoute.erase(route.back().group);
+            state.leaveRoute(route.back().group, count == route.back().countOnEntry);
             route.pop_back();
             continue;
         }
         Tsd_UserGroup* user = member->getUserGroup();
-        if (user == nullptr || circleFree.contains(user))
+        if (user == nullptr || state.isFree(user))
             continue;
-        if (onRoute.contains(user)) {
+        if (state.isOnRoute(user)) {
             ++count;
             if (report)
                 reportCircle(route);
             continue;
         }
         route.emplace_back(user, count);
-        onRoute.insert(user);
+        state.enterRoute(user);
     }
     return count;
 }
 
 int Tsd_UserGroup::checkInExcludes(bool report) {
-    tsd_detail::CircleFreeGroups circleFree;
-    return tsd_detail::countCircles(this, report, circleFree);
+    tsd_detail::CircleSearchState state;
+    return tsd_detail::countCircles(this, report, state);
 }
 
 // --- Tsd_UserGroupIter -----------------------------------------------------

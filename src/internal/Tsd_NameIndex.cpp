@@ -8,7 +8,7 @@ namespace tsd_detail {
 
 namespace {
 
-std::uint32_t g_nameChanges = 0;
+std::uint64_t g_nameChanges = 0;
 
 std::uint32_t hashKey(const char* key) {
     auto h = static_cast<std::uint64_t>(std::hash<std::string_view>()(std::string_view(key)));
@@ -17,7 +17,7 @@ std::uint32_t hashKey(const char* key) {
 
 } // namespace
 
-std::uint32_t nameChanges() {
+std::uint64_t nameChanges() {
     return g_nameChanges;
 }
 
@@ -26,10 +26,13 @@ void noteNameChange() {
 }
 
 bool NameIndex::liveHead(const Tsd_BaseObjList& list, Bucket& bucket) {
+    const std::int32_t tail = m_tail[static_cast<std::size_t>(bucket.head)];
     while (bucket.head >= 0 && list.getAt(bucket.head) == nullptr)
         bucket.head = m_next[static_cast<std::size_t>(bucket.head)];
-    if (bucket.head >= 0)
+    if (bucket.head >= 0) {
+        m_tail[static_cast<std::size_t>(bucket.head)] = tail;
         return true;
+    }
     bucket.head = kGone;
     return false;
 }
@@ -49,11 +52,11 @@ void NameIndex::rehash() {
     for (const Bucket& bucket : m_table)
         live += bucket.head >= 0 ? 1 : 0;
     std::size_t size = 16;
-    while (size < 8 * live)
+    while (size < 4 * live)
         size *= 2;
     std::vector<Bucket> old;
     old.swap(m_table);
-    m_table.assign(size, Bucket{0, kFree, kFree});
+    m_table.assign(size, Bucket{0, kFree});
     m_taken = 0;
     const std::size_t mask = size - 1;
     for (const Bucket& bucket : old) {
@@ -78,12 +81,14 @@ void NameIndex::insert(const Tsd_BaseObjList& list, std::int32_t slot, const cha
         Bucket& bucket = m_table[i];
         if (bucket.hash == hash && bucket.head >= 0 && liveHead(list, bucket) &&
             headMatches(list, bucket, key)) {
-            m_next[static_cast<std::size_t>(bucket.tail)] = slot;
-            bucket.tail = slot;
+            std::int32_t& tail = m_tail[static_cast<std::size_t>(bucket.head)];
+            m_next[static_cast<std::size_t>(tail)] = slot;
+            tail = slot;
             return;
         }
     }
-    m_table[i] = Bucket{hash, slot, slot};
+    m_table[i] = Bucket{hash, slot};
+    m_tail[static_cast<std::size_t>(slot)] = slot;
     ++m_taken;
 }
 
@@ -95,11 +100,13 @@ void NameIndex::catchUp(const Tsd_BaseObjList& list) {
         m_table.clear();
         m_taken = 0;
         m_next.clear();
+        m_tail.clear();
         m_foreign.clear();
         m_foreignHead = 0;
     }
     for (auto slot = static_cast<std::int32_t>(m_next.size()); slot < list.getCount(); ++slot) {
         m_next.push_back(-1);
+        m_tail.push_back(-1);
         Tsd_BaseObj* obj = list.getAt(slot);
         if (obj == nullptr)
             continue;

@@ -10,7 +10,7 @@ namespace tsd_detail {
 
 // A library-wide count of name and TSid changes: an index by name is rebuilt
 // when it moved since the index was last brought up to date.
-std::uint32_t nameChanges();
+std::uint64_t nameChanges();
 void noteNameChange();
 
 // The first slot of a list whose element has a given key (a group's name, a
@@ -39,7 +39,6 @@ private:
     struct Bucket {
         std::uint32_t hash;
         std::int32_t head; // first slot of the chain; kFree or kGone when none
-        std::int32_t tail;
     };
     static constexpr std::int32_t kFree = -2; // never used
     static constexpr std::int32_t kGone = -1; // its slots were all cleared
@@ -54,10 +53,11 @@ private:
     KeyOf m_keyOf;
     bool m_built = false;
     std::uint32_t m_shape = 0;
-    std::uint32_t m_changes = 0;
+    std::uint64_t m_changes = 0;
     std::vector<Bucket> m_table;         // open addressing, power-of-two size
     std::size_t m_taken = 0;             // buckets not kFree
     std::vector<std::int32_t> m_next;    // per slot: the next slot of its chain
+    std::vector<std::int32_t> m_tail;    // per chain head: the last slot of the chain
     std::vector<std::int32_t> m_foreign; // slots of foreign elements, ascending
     std::size_t m_foreignHead = 0;       // the ones before it were cleared
 };

@@ -8,25 +8,27 @@
 
 namespace tsd_detail {
 
-// Calls visit(p) for each distinct pointer of `items`, in the order of first
-// occurrence. Sequences without repeats (the usual case) cost a sort of
-// their addresses; only pointers that do repeat are remembered.
-template <class T, class Visit>
-void forEachOnce(const std::vector<T*>& items, Visit visit) {
-    std::vector<T*> sorted(items);
-    std::sort(sorted.begin(), sorted.end(), std::less<T*>());
-    std::unordered_set<T*> repeated;
-    for (std::size_t i = 1; i < sorted.size(); ++i)
-        if (sorted[i] == sorted[i - 1])
-            repeated.insert(sorted[i]);
-    sorted.clear();
-    sorted.shrink_to_fit();
-    std::unordered_set<T*> visited;
-    for (T* p : items) {
-        if (!repeated.empty() && repeated.count(p) != 0 && !visited.insert(p).second)
-            continue;
-        visit(p);
+// Tells, pointer by pointer in the order of `items`, whether a pointer is
+// met for the first time. Sequences without repeats (the usual case) cost a
+// sort of their addresses; only pointers that do repeat are remembered.
+template <class T>
+class FirstSeen {
+public:
+    explicit FirstSeen(const std::vector<T*>& items) {
+        std::vector<T*> sorted(items);
+        std::sort(sorted.begin(), sorted.end(), std::less<T*>());
+        for (std::size_t i = 1; i < sorted.size(); ++i)
+            if (sorted[i] == sorted[i - 1])
+                m_repeated.insert(sorted[i]);
     }
-}
+
+    bool operator()(T* p) {
+        return m_repeated.empty() || m_repeated.count(p) == 0 || m_seen.insert(p).second;
+    }
+
+private:
+    std::unordered_set<T*> m_repeated;
+    std::unordered_set<T*> m_seen;
+};
 
 } // namespace tsd_detail
