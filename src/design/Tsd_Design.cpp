@@ -14,28 +14,13 @@ using tsd_detail::NameIndex;
 
 const char* kGlobalTIGName = "global";
 
-const char* groupName(Tsd_BaseObj* obj, bool& foreign) {
-    Tsd_Group* group = obj->getGroup();
-    foreign = group == nullptr;
-    return group != nullptr ? group->getName() : nullptr;
-}
-
-const char* clockGroupName(Tsd_BaseObj* obj, bool& foreign) {
-    Tsd_ClkGroup* group = obj->getClkGroup();
-    foreign = group == nullptr;
-    return group != nullptr ? group->getName() : nullptr;
-}
-
-const char* tigGroupName(Tsd_BaseObj* obj, bool& foreign) {
-    Tsd_TIGGroup* group = obj->getTIGGroup();
-    foreign = group == nullptr;
-    return group != nullptr ? group->getName() : nullptr;
-}
-
-const char* endpointSpecTSid(Tsd_BaseObj* obj, bool& foreign) {
-    Tsd_EndpointSpec* spec = obj->getEndpointSpec();
-    foreign = spec == nullptr;
-    return spec != nullptr ? spec->getTSid() : nullptr;
+// The key of an element of a typed list: the name (or TSid) of what the
+// list's downcast gives; an element it refuses is foreign.
+template <class T, T* (Tsd_BaseObj::*Cast)(), class Keyed, const char* (Keyed::*Key)() const>
+const char* keyOf(Tsd_BaseObj* obj, bool& foreign) {
+    T* typed = (obj->*Cast)();
+    foreign = typed == nullptr;
+    return typed != nullptr ? (typed->*Key)() : nullptr;
 }
 
 // An index for a list and one for its trash.
@@ -48,10 +33,13 @@ struct IndexPair {
 } // namespace
 
 struct Tsd_Design::FindIndexes {
-    IndexPair groups{groupName};
-    IndexPair clockGroups{clockGroupName};
-    IndexPair tigGroups{tigGroupName};
-    IndexPair endpointSpecs{endpointSpecTSid};
+    IndexPair groups{keyOf<Tsd_Group, &Tsd_BaseObj::getGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair clockGroups{
+        keyOf<Tsd_ClkGroup, &Tsd_BaseObj::getClkGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair tigGroups{
+        keyOf<Tsd_TIGGroup, &Tsd_BaseObj::getTIGGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair endpointSpecs{
+        keyOf<Tsd_EndpointSpec, &Tsd_BaseObj::getEndpointSpec, Tsd_Spec, &Tsd_Spec::getTSid>};
 };
 
 Tsd_Design::FindIndexes& Tsd_Design::findIndexes() const {
@@ -174,9 +162,9 @@ namespace {
 // The first element of the active list (then, when asked, of the trash) whose
 // key equals `key`, as a walk in list order finds it: an element of another
 // class met on the way is a broken invariant.
-template <class T, class Cast>
+template <class T, T* (Tsd_BaseObj::*Cast)()>
 T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, IndexPair& indexes,
-          bool includeTrash, const char* key, Cast cast, const char* wrongClassMessage) {
+          bool includeTrash, const char* key, const char* wrongClassMessage) {
     const std::pair<const Tsd_BaseObjList*, NameIndex*> lists[] = {{&active, &indexes.active},
                                                                    {&trash, &indexes.trash}};
     for (const auto& list : lists) {
@@ -186,7 +174,7 @@ T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, IndexPair
         if (hit.foreignBefore)
             TSD_MSG().fatal(2, "%s", wrongClassMessage);
         if (hit.slot >= 0)
-            return cast(list.first->getAt(hit.slot));
+            return (list.first->getAt(hit.slot)->*Cast)();
     }
     return nullptr;
 }
@@ -194,29 +182,29 @@ T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, IndexPair
 } // namespace
 
 Tsd_Group* Tsd_Design::findGroupByUserName(const char* name, bool includeTrash) const {
-    return findIn<Tsd_Group>(
-        m_groups.active, m_groups.trash, findIndexes().groups, includeTrash, name,
-        [](Tsd_BaseObj* o) { return o->getGroup(); }, "Non-group object.\n");
+    return findIn<Tsd_Group, &Tsd_BaseObj::getGroup>(m_groups.active, m_groups.trash,
+                                                     findIndexes().groups, includeTrash, name,
+                                                     "Non-group object.\n");
 }
 
 Tsd_ClkGroup* Tsd_Design::findClockGroupByNetName(const char* netName, bool includeTrash) const {
-    return findIn<Tsd_ClkGroup>(
+    return findIn<Tsd_ClkGroup, &Tsd_BaseObj::getClkGroup>(
         m_clockGroups.active, m_clockGroups.trash, findIndexes().clockGroups, includeTrash, netName,
-        [](Tsd_BaseObj* o) { return o->getClkGroup(); }, "Non-clock group object.\n");
+        "Non-clock group object.\n");
 }
 
 Tsd_TIGGroup* Tsd_Design::findTIGByTSid(const char* tsid, bool includeTrash) const {
     if (tsid == nullptr || *tsid == 0)
         tsid = kGlobalTIGName;
-    return findIn<Tsd_TIGGroup>(
-        m_tigGroups.active, m_tigGroups.trash, findIndexes().tigGroups, includeTrash, tsid,
-        [](Tsd_BaseObj* o) { return o->getTIGGroup(); }, "Non-TIG object.\n");
+    return findIn<Tsd_TIGGroup, &Tsd_BaseObj::getTIGGroup>(m_tigGroups.active, m_tigGroups.trash,
+                                                           findIndexes().tigGroups, includeTrash,
+                                                           tsid, "Non-TIG object.\n");
 }
 
 Tsd_EndpointSpec* Tsd_Design::findEndpointSpecByTSid(const char* tsid, bool includeTrash) const {
-    return findIn<Tsd_EndpointSpec>(
+    return findIn<Tsd_EndpointSpec, &Tsd_BaseObj::getEndpointSpec>(
         m_endpointSpecs.active, m_endpointSpecs.trash, findIndexes().endpointSpecs, includeTrash,
-        tsid, [](Tsd_BaseObj* o) { return o->getEndpointSpec(); }, "Non-endpoint spec object.\n");
+        tsid, "Non-endpoint spec object.\n");
 }
 
 void Tsd_Design::dumpList(DumpStream& stream, short indent, const ListPair& pair) const {
