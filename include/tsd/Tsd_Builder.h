@@ -6,7 +6,6 @@
 
 #include <memory>
 #include <string>
-#include <unordered_map>
 #include <vector>
 
 #include "tsd/Tsd_BaseObj.h"
@@ -115,8 +114,9 @@ private:
                             Result (Tsd_Builder::*process)(const char*, const char*));
     bool initUserGroupFromProp(Tsd_UserGroup* group, const char* value);
     Tsd_Spec* buildSpecFromProp(const char* name, const char* value);
-    // Removes the pending-link record of `spec`, if it has one.
-    void dropPendingLink(const Tsd_Spec* spec);
+    // Removes the pending-link record of `spec`, if it has one; `newest`
+    // says that spec was the last one parsed.
+    void dropPendingLink(const Tsd_Spec* spec, bool newest);
     Tsd_Spec* buildNetSpecFromProp(const char* name, const char* value);
     Tsd_Group* getSimpleGroup(const char* name, const char* value);
 
@@ -144,8 +144,9 @@ private:
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_specProps;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_groupProps;
     DARRAY_Tsd_PendPtr m_pendingLinks;
-    // Where each spec's pending link record stands in m_pendingLinks.
-    std::unordered_map<const Tsd_Spec*, std::size_t> m_pendingLinkSlot;
+    // Where each spec's pending link record stands in m_pendingLinks; made
+    // when a record other than the newest is first dropped.
+    std::unique_ptr<Tsd_SlotIndex> m_pendingLinkSlot;
     Tsd_String m_pendingLinkTSid;
     DARRAY_Tsd_PendPtr m_pendingRegGroups;
     Tsd_String m_pendingRegGroupName;

@@ -344,14 +344,14 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
             if (!allowEndpointSpecOverride(existing, value)) {
                 // The refused spec may already wait for a link: that record
                 // goes with it.
-                dropPendingLink(spec);
+                dropPendingLink(spec, true);
                 delete spec;
                 return nullptr;
             }
             // The displaced spec goes to the trash, where pointers to it stay
             // valid and the design deletes it in the end.
             d.moveEndpointSpecToTrash(existing);
-            dropPendingLink(existing);
+            dropPendingLink(existing, false);
         }
         d.addEndpointSpec(endpoint);
     } else if (Tsd_Offset* offset = spec->getOffset()) {
@@ -362,14 +362,30 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
     return spec;
 }
 
-void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec) {
+void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec, bool newest) {
     // The record's entry is cleared rather than erased: every reader skips
     // cleared entries, and the positions of the others stay valid.
-    auto it = m_pendingLinkSlot.find(spec);
-    if (it == m_pendingLinkSlot.end())
+    if (newest) {
+        // Its record, if any, is the last one made.
+        if (!m_pendingLinks.empty() && m_pendingLinks.back() != nullptr &&
+            m_pendingLinks.back()->spec == spec) {
+            if (m_pendingLinkSlot != nullptr)
+                m_pendingLinkSlot->remove(spec, static_cast<int>(m_pendingLinks.size() - 1));
+            m_pendingLinks.back().reset();
+        }
         return;
-    m_pendingLinks[it->second].reset();
-    m_pendingLinkSlot.erase(it);
+    }
+    if (m_pendingLinkSlot == nullptr) {
+        m_pendingLinkSlot = std::make_unique<Tsd_SlotIndex>();
+        for (std::size_t i = 0; i < m_pendingLinks.size(); ++i)
+            if (m_pendingLinks[i] != nullptr)
+                m_pendingLinkSlot->add(m_pendingLinks[i]->spec, static_cast<int>(i));
+    }
+    const int slot = m_pendingLinkSlot->first(spec);
+    if (slot < 0)
+        return;
+    m_pendingLinks[static_cast<std::size_t>(slot)].reset();
+    m_pendingLinkSlot->remove(spec, slot);
 }
 
 Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
@@ -421,7 +437,8 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         Tsd_EndpointSpec* endpoint = spec->getEndpointSpec();
         if (endpoint == nullptr)
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
-        m_pendingLinkSlot[endpoint] = m_pendingLinks.size();
+        if (m_pendingLinkSlot != nullptr)
+            m_pendingLinkSlot->add(endpoint, static_cast<int>(m_pendingLinks.size()));
         m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
         m_pendingLinkTSid.set(nullptr);
     }
