@@ -61,8 +61,9 @@ private:
 };
 
 namespace tsd_detail {
+class LinkGraph;
 class NameIndex;
-}
+} // namespace tsd_detail
 
 // Where the pointers of a large array stand: for each pointer held, the first
 // slot holding it and how many slots hold it. Internal to Tsd_DArray.
@@ -211,6 +212,7 @@ protected:
     }
 
 private:
+    friend class tsd_detail::LinkGraph;
     friend class tsd_detail::NameIndex;
 
     // Arrays up to this size are scanned; an index would cost more.

@@ -63,7 +63,7 @@ public:
           m_firstZero(static_cast<std::size_t>(m_graph.size()), -1),
           m_divides(static_cast<std::size_t>(m_graph.size()), 0) {
         std::vector<char> ignored(m_divides.size(), 0);
-        for (int id = 0; id < m_graph.size(); ++id) {
+        for (int id : m_graph.order()) {
             m_divides[static_cast<std::size_t>(id)] = tsd_detail::dividesByZero(m_graph.spec(id));
             ignored[static_cast<std::size_t>(id)] = m_graph.spec(id)->isIgnored();
         }
@@ -108,12 +108,12 @@ public:
         }
     }
 
-    // What spec->checkLink(true) returns and reports.
-    int check(Tsd_EndpointSpec* spec) const {
+    // What checkLink(true) returns and reports for the spec at `slot`.
+    int check(Tsd_EndpointSpec* spec, int slot) const {
         if (spec->hasDelayValue() || spec->isIgnored())
             return 0;
         // Only linked specs are in the graph.
-        const int id = m_graph.idOf(spec);
+        const int id = m_graph.idAt(slot, spec);
         const int next = id >= 0 ? m_graph.next(id) : -1;
         const End end = next >= 0 ? m_end[static_cast<std::size_t>(next)] : MISSING;
         if (end == MISSING || end == CIRCLE)
@@ -298,11 +298,13 @@ void Tsd_Builder::resolvePendingLinks() {
     }
     if (failed)
         return;
-    LinkChecker checker(*d.getEndpointSpecList());
-    Tsd_BaseObjListIter iter(d.getEndpointSpecList());
-    while (Tsd_BaseObj* obj = iter.next())
-        if (Tsd_EndpointSpec* spec = obj->getEndpointSpec())
-            addErrorCount(checker.check(spec));
+    const Tsd_BaseObjList& specs = *d.getEndpointSpecList();
+    LinkChecker checker(specs);
+    for (int slot = 0; slot < specs.getCount(); ++slot) {
+        Tsd_BaseObj* obj = specs.getAt(slot);
+        if (Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr)
+            addErrorCount(checker.check(spec, slot));
+    }
 }
 
 void Tsd_Builder::installTIGs() {

@@ -78,7 +78,7 @@ public:
         m_firstZero.assign(n, -1);
         m_divides.assign(n, 0);
         std::vector<char> trashed(n);
-        for (int id = 0; id < m_graph.size(); ++id) {
+        for (int id : m_graph.order()) {
             m_divides[static_cast<std::size_t>(id)] = tsd_detail::dividesByZero(m_graph.spec(id));
             trashed[static_cast<std::size_t>(id)] = trash.contains(m_graph.spec(id));
         }
@@ -115,13 +115,13 @@ public:
         buildTour();
     }
 
-    // Steps a and b for one spec of the list; false when its link check
-    // fails, which also skips the rest of the spec's unlinking.
-    bool visit(Tsd_EndpointSpec* spec) {
+    // Steps a and b for the spec at `slot` of the list; false when its link
+    // check fails, which also skips the rest of the spec's unlinking.
+    bool visit(Tsd_EndpointSpec* spec, int slot) {
         if (spec->hasDelayValue())
             return true;
         // Only linked specs are in the graph.
-        const int id = m_graph.idOf(spec);
+        const int id = m_graph.idAt(slot, spec);
         const int next = id >= 0 ? m_graph.next(id) : -1;
         if (next < 0) {
             // Nothing to follow: fine for an ignored spec, else the link
@@ -211,47 +211,41 @@ private:
         }
     }
 
-    // The Euler tour of the forest of chains that end at a delay.
+    // The Euler tour of the forest of chains that end at a delay: a subtree
+    // takes the positions from its root's on, as many as it has nodes, so
+    // sizes summed from the leaves up place every node, parents first.
     void buildTour() {
         const auto n = static_cast<std::size_t>(m_graph.size());
-        std::vector<int> firstChild(n + 1, 0);
-        for (int id = 0; id < m_graph.size(); ++id)
-            if (m_root[static_cast<std::size_t>(id)] >= 0 &&
-                m_root[static_cast<std::size_t>(id)] != id)
-                ++firstChild[static_cast<std::size_t>(m_graph.next(id)) + 1];
-        for (std::size_t k = 1; k <= n; ++k)
-            firstChild[k] += firstChild[k - 1];
-        std::vector<int> children(static_cast<std::size_t>(firstChild[n]));
-        std::vector<int> fill(firstChild.begin(), firstChild.end() - 1);
-        for (int id = 0; id < m_graph.size(); ++id)
-            if (m_root[static_cast<std::size_t>(id)] >= 0 &&
-                m_root[static_cast<std::size_t>(id)] != id)
-                children[static_cast<std::size_t>(
-                    fill[static_cast<std::size_t>(m_graph.next(id))]++)] = id;
+        const std::vector<int>& order = m_graph.order();
+        auto inForest = [&](int id) { return m_root[static_cast<std::size_t>(id)] >= 0; };
+        auto isRoot = [&](int id) { return m_root[static_cast<std::size_t>(id)] == id; };
+        std::vector<int> size(n, 1);
+        for (auto it = order.rbegin(); it != order.rend(); ++it)
+            if (inForest(*it) && !isRoot(*it))
+                size[static_cast<std::size_t>(m_graph.next(*it))] +=
+                    size[static_cast<std::size_t>(*it)];
         m_enter.assign(n, 0);
-        m_leave.assign(n, 0);
         m_depth.assign(n, 0);
+        std::vector<int> nextFree(n, 0); // the next position for a child
         int time = 0;
-        std::vector<std::pair<int, int>> stack; // node, next child to visit
-        for (int id = 0; id < m_graph.size(); ++id) {
-            if (m_root[static_cast<std::size_t>(id)] != id)
+        for (int id : order) {
+            const auto i = static_cast<std::size_t>(id);
+            if (!inForest(id))
                 continue;
-            stack.emplace_back(id, firstChild[static_cast<std::size_t>(id)]);
-            m_enter[static_cast<std::size_t>(id)] = time++;
-            while (!stack.empty()) {
-                auto& top = stack.back();
-                const auto node = static_cast<std::size_t>(top.first);
-                if (top.second < firstChild[node + 1]) {
-                    const int child = children[static_cast<std::size_t>(top.second++)];
-                    m_enter[static_cast<std::size_t>(child)] = time++;
-                    m_depth[static_cast<std::size_t>(child)] = m_depth[node] + 1;
-                    stack.emplace_back(child, firstChild[static_cast<std::size_t>(child)]);
-                } else {
-                    m_leave[node] = time;
-                    stack.pop_back();
-                }
+            if (isRoot(id)) {
+                m_enter[i] = time;
+                time += size[i];
+            } else {
+                const auto parent = static_cast<std::size_t>(m_graph.next(id));
+                m_enter[i] = nextFree[parent];
+                nextFree[parent] += size[i];
+                m_depth[i] = m_depth[parent] + 1;
             }
+            nextFree[i] = m_enter[i] + 1;
         }
+        for (std::size_t i = 0; i < n; ++i)
+            size[i] += m_enter[i];
+        m_leave = std::move(size);
         m_tourSize = time;
         m_marks.assign(2 * static_cast<std::size_t>(time), -1);
     }
@@ -598,12 +592,14 @@ void Tsd_Design::unlinkTrash() {
 
     // 2. Endpoint specs linked into the trash keep their computed delay.
     LinkFreezer freezer(m_endpointSpecs.active, m_endpointSpecs.trash);
-    Tsd_BaseObjListIter specs(&m_endpointSpecs.active);
-    while (Tsd_BaseObj* obj = specs.next()) {
+    for (int slot = 0; slot < m_endpointSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_endpointSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_EndpointSpec* spec = obj->getEndpointSpec();
         if (spec == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
-        if (!freezer.visit(spec))
+        if (!freezer.visit(spec, slot))
             continue;
         if (spec->getIgnoreGroup() != nullptr && isTIGGroupTrashed(spec->getIgnoreGroup()))
             spec->setIgnoreGroup(nullptr);

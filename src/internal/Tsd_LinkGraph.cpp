@@ -4,25 +4,28 @@
 
 namespace tsd_detail {
 
-LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
+LinkGraph::LinkGraph(const Tsd_BaseObjList& list) : m_list(list) {
     // Number every linked spec of the list and every spec its chain reaches,
     // following each chain only as far as the first spec already numbered.
-    m_ids.reserve(static_cast<std::size_t>(list.getCount()));
+    // A spec of the list is numbered by its first slot there, which the
+    // list's own index finds; a spec reached only through links gets a
+    // number after those.
+    m_specs.assign(static_cast<std::size_t>(list.getCount()), nullptr);
+    m_next.assign(m_specs.size(), -1);
     for (int i = 0; i < list.getCount(); ++i) {
         Tsd_BaseObj* obj = list.getAt(i);
         Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr;
-        if (spec == nullptr || !spec->isLinked())
+        // A slot already numbered holds the spec it was numbered for.
+        if (spec == nullptr || !spec->isLinked() || m_specs[static_cast<std::size_t>(i)] != nullptr)
             continue;
-        while (spec != nullptr && m_ids.first(spec) < 0) {
-            m_ids.add(spec, size());
-            m_specs.push_back(spec);
+        bool added = false;
+        int id = number(spec, added);
+        while (added && spec->getLinkedSpec() != nullptr) {
             spec = spec->getLinkedSpec();
+            const int next = number(spec, added);
+            m_next[static_cast<std::size_t>(id)] = next;
+            id = next;
         }
-    }
-    m_next.resize(m_specs.size());
-    for (int id = 0; id < size(); ++id) {
-        Tsd_EndpointSpec* linked = spec(id)->getLinkedSpec();
-        m_next[static_cast<std::size_t>(id)] = linked != nullptr ? m_ids.first(linked) : -1;
     }
 
     // Walk each chain from its first unvisited node; a walk that comes back
@@ -33,6 +36,8 @@ LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
     m_order.reserve(m_specs.size());
     std::vector<int> path;
     for (int start = 0; start < size(); ++start) {
+        if (spec(start) == nullptr)
+            continue;
         path.clear();
         int x = start;
         while (x != -1 && state[static_cast<std::size_t>(x)] == NEW) {
@@ -60,8 +65,32 @@ LinkGraph::LinkGraph(const Tsd_BaseObjList& list) {
     }
 }
 
+int LinkGraph::number(Tsd_EndpointSpec* spec, bool& added) {
+    const int slot = m_list.firstSlotOf(spec);
+    if (slot >= 0) {
+        added = m_specs[static_cast<std::size_t>(slot)] == nullptr;
+        m_specs[static_cast<std::size_t>(slot)] = spec;
+        return slot;
+    }
+    const int id = m_unlisted.first(spec);
+    added = id < 0;
+    if (!added)
+        return id;
+    m_unlisted.add(spec, size());
+    m_specs.push_back(spec);
+    m_next.push_back(-1);
+    return size() - 1;
+}
+
+int LinkGraph::idAt(int slot, const Tsd_EndpointSpec* spec) const {
+    return spec == m_specs[static_cast<std::size_t>(slot)] ? slot : idOf(spec);
+}
+
 int LinkGraph::idOf(const Tsd_EndpointSpec* spec) const {
-    return m_ids.first(spec);
+    const int slot = m_list.firstSlotOf(spec);
+    if (slot >= 0)
+        return m_specs[static_cast<std::size_t>(slot)] != nullptr ? slot : -1;
+    return m_unlisted.first(spec);
 }
 
 std::vector<int> LinkGraph::cycleNodes(int c) const {

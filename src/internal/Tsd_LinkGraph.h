@@ -20,9 +20,13 @@ public:
     // and every spec their links reach.
     explicit LinkGraph(const Tsd_BaseObjList& list);
 
+    // Nodes are numbered below size(); a number without a spec is no node.
     int size() const { return static_cast<int>(m_specs.size()); }
     // The node of `spec`, or -1.
     int idOf(const Tsd_EndpointSpec* spec) const;
+    // The same for the spec at `slot` of the list, mostly without a lookup.
+    int idAt(int slot, const Tsd_EndpointSpec* spec) const;
+    // The spec of node `id`, or null when `id` is no node.
     Tsd_EndpointSpec* spec(int id) const { return m_specs[static_cast<std::size_t>(id)]; }
     // The node that `id` links to; -1 when its chain ends there.
     int next(int id) const { return m_next[static_cast<std::size_t>(id)]; }
@@ -41,8 +45,12 @@ public:
                                        const std::vector<char>& flag);
 
 private:
+    // The node of `spec`, numbered now if it had none (`added` then true).
+    int number(Tsd_EndpointSpec* spec, bool& added);
+
+    const Tsd_BaseObjList& m_list;
     std::vector<Tsd_EndpointSpec*> m_specs;
-    Tsd_SlotIndex m_ids; // the node of each spec, as its "slot"
+    Tsd_SlotIndex m_unlisted; // the node of each spec outside the list, as its "slot"
     std::vector<int> m_next;
     std::vector<int> m_cycleOf;
     std::vector<int> m_cycleStart{0}; // cycle c is m_cycleNodes[start[c], start[c+1])
