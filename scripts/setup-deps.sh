@@ -4,7 +4,7 @@
 set -euo pipefail
 
 packages=(cmake ninja-build g++ libgtest-dev libbenchmark-dev clang-format gcovr
-          clang libclang-rt-14-dev nlohmann-json3-dev libcli11-dev graphviz pkgconf)
+          clang libclang-rt-14-dev nlohmann-json3-dev libcli11-dev graphviz pkgconf time)
 
 missing=()
 for p in "${packages[@]}"; do

@@ -1,0 +1,106 @@
+#include "Hints.h"
+
+#include "PropFile.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cstdlib>
+
+namespace tsd_cli {
+
+namespace {
+
+// The edit distance of a and b counting a swap of neighbours as one edit,
+// or bound + 1 when it exceeds the bound. Only the diagonal band of width
+// 2 * bound + 1 is computed, and the walk stops when a whole row exceeds
+// the bound.
+class BoundedDistance {
+public:
+    explicit BoundedDistance(int bound) : m_bound(bound) {}
+
+    int operator()(std::string_view a, std::string_view b) {
+        const int far = m_bound + 1;
+        int n = static_cast<int>(a.size());
+        int m = static_cast<int>(b.size());
+        if (std::abs(n - m) > m_bound)
+            return far;
+        for (std::vector<int>* row : {&m_before, &m_previous, &m_current})
+            row->assign(static_cast<std::size_t>(m) + 1, far);
+        for (int j = 0; j <= std::min(m, m_bound); ++j)
+            m_previous[static_cast<std::size_t>(j)] = j;
+        for (int i = 1; i <= n; ++i) {
+            int low = std::max(1, i - m_bound);
+            int high = std::min(m, i + m_bound);
+            auto at = [](std::vector<int>& row, int j) -> int& {
+                return row[static_cast<std::size_t>(j)];
+            };
+            at(m_current, low - 1) = low == 1 && i <= m_bound ? i : far;
+            if (high + 1 <= m)
+                at(m_current, high + 1) = far;
+            int rowMin = at(m_current, low - 1);
+            for (int j = low; j <= high; ++j) {
+                int cost = a[static_cast<std::size_t>(i - 1)] == b[static_cast<std::size_t>(j - 1)]
+                               ? 0
+                               : 1;
+                int best = std::min({at(m_previous, j) + 1, at(m_current, j - 1) + 1,
+                                     at(m_previous, j - 1) + cost});
+                if (i > 1 && j > 1 &&
+                    a[static_cast<std::size_t>(i - 1)] == b[static_cast<std::size_t>(j - 2)] &&
+                    a[static_cast<std::size_t>(i - 2)] == b[static_cast<std::size_t>(j - 1)])
+                    best = std::min(best, at(m_before, j - 2) + 1);
+                at(m_current, j) = std::min(best, far);
+                rowMin = std::min(rowMin, at(m_current, j));
+            }
+            if (rowMin > m_bound)
+                return far;
+            std::swap(m_before, m_previous);
+            std::swap(m_previous, m_current);
+        }
+        return std::min(m_previous[static_cast<std::size_t>(m)], far);
+    }
+
+private:
+    int m_bound;
+    std::vector<int> m_before, m_previous, m_current;
+};
+
+} // namespace
+
+bool equalsNoCase(std::string_view a, std::string_view b) {
+    if (a.size() != b.size())
+        return false;
+    for (std::size_t i = 0; i < a.size(); ++i)
+        if (std::toupper(static_cast<unsigned char>(a[i])) !=
+            std::toupper(static_cast<unsigned char>(b[i])))
+            return false;
+    return true;
+}
+
+std::optional<std::string> closestName(std::string_view name,
+                                       const std::vector<std::string>& defined) {
+    int bound = std::max(1, std::min(2, static_cast<int>(name.size()) / 3));
+    BoundedDistance distance(bound);
+    const std::string* best = nullptr;
+    int bestScore = bound + 1;
+    for (const std::string& candidate : defined) {
+        if (candidate != name && equalsNoCase(name, candidate))
+            return candidate; // nothing is closer
+        if (candidate == name)
+            continue;
+        int score = distance(name, candidate);
+        if (score < bestScore) {
+            bestScore = score;
+            best = &candidate;
+        }
+    }
+    if (best == nullptr)
+        return std::nullopt;
+    return *best;
+}
+
+std::string didYouMean(std::string_view name, const std::vector<std::string>& defined) {
+    std::optional<std::string> close = closestName(name, defined);
+    return close ? "did you mean " + inQuotes(*close) + "?" : std::string();
+}
+
+} // namespace tsd_cli
