@@ -60,15 +60,75 @@ private:
     std::unique_ptr<char[]> m_text;
 };
 
+namespace tsd_detail {
+class LinkGraph;
+class NameIndex;
+} // namespace tsd_detail
+
+// Where the pointers of a large array stand: for each pointer held, the first
+// slot holding it and how many slots hold it. Internal to Tsd_DArray.
+class Tsd_SlotIndex {
+public:
+    // Records that `slot` now holds p (p not null).
+    void add(const void* p, std::int32_t slot);
+    // Records that `slot`, which held p, no longer does. True when p is still
+    // held elsewhere and `slot` was its first: the caller then finds the next
+    // slot holding p and tells it with setFirst.
+    bool remove(const void* p, std::int32_t slot);
+    void setFirst(const void* p, std::int32_t slot);
+    // The first slot holding p, or -1.
+    std::int32_t first(const void* p) const;
+    // Room for n pointers without growing again.
+    void reserve(std::size_t n);
+
+private:
+    struct Entry {
+        const void* key;
+        std::int32_t first;
+        std::int32_t count;
+    };
+    std::size_t probe(const void* p) const;
+    void rehash(std::size_t size);
+
+    std::vector<Entry> m_table; // open addressing; a null key is a free entry
+    std::size_t m_used = 0;
+};
+
 // A growable array of pointers that never owns what its slots point to.
 // Slots 0 to getCount()-1 may be read; a slot may hold null.
+//
+// It counts the slots that hold a pointer, so emptiness is known at once, and
+// an array that grows past a few dozen slots and is asked where a pointer
+// stands builds an index of its pointers, kept up to date from then on; small
+// arrays, and arrays never asked, carry no index.
 template <class T>
 class Tsd_DArray {
 public:
-    explicit Tsd_DArray(int initialCapacity = 10) {
-        if (initialCapacity > 0)
-            m_slots.reserve(static_cast<std::size_t>(initialCapacity));
+    // The storage is allocated on the first append, not here: most lists of
+    // a large design hold one or two pointers, or none.
+    explicit Tsd_DArray(int /*initialCapacity*/ = 10) {}
+    Tsd_DArray(const Tsd_DArray& other) : m_slots(other.m_slots), m_live(other.m_live) {}
+    Tsd_DArray& operator=(const Tsd_DArray& other) {
+        if (this != &other) {
+            m_slots = other.m_slots;
+            m_live = other.m_live;
+            m_index.reset();
+            ++m_shape;
+        }
+        return *this;
     }
+    Tsd_DArray(Tsd_DArray&&) noexcept = default;
+    Tsd_DArray& operator=(Tsd_DArray&& other) noexcept {
+        m_slots = std::move(other.m_slots);
+        m_live = other.m_live;
+        m_index = std::move(other.m_index);
+        ++m_shape;
+        other.m_slots.clear();
+        other.m_live = 0;
+        ++other.m_shape;
+        return *this;
+    }
+    ~Tsd_DArray() = default;
 
     int getCount() const { return static_cast<int>(m_slots.size()); }
     // Slot i, or null when i is outside 0..getCount()-1.
@@ -78,20 +138,101 @@ public:
     T* operator[](int i) const { return getAt(i); }
     // Stores p in slot i; ignored when i is outside 0..getCount()-1.
     void setAt(int i, T* p) {
-        if (i >= 0 && i < getCount())
-            m_slots[static_cast<std::size_t>(i)] = p;
+        if (i < 0 || i >= getCount())
+            return;
+        T*& slot = m_slots[static_cast<std::size_t>(i)];
+        T* old = slot;
+        if (old == p)
+            return;
+        slot = p;
+        if (old != nullptr) {
+            --m_live;
+            if (m_index != nullptr && m_index->remove(old, i)) {
+                // Only a pointer stored twice by hand gets here.
+                int next = i + 1;
+                while (next < getCount() && m_slots[static_cast<std::size_t>(next)] != old)
+                    ++next;
+                m_index->setFirst(old, next);
+            }
+        }
+        if (p != nullptr) {
+            ++m_live;
+            if (m_index != nullptr)
+                m_index->add(p, i);
+            // Only clearing a slot keeps the layout that name lookups rely on.
+            ++m_shape;
+        }
     }
-    void append(T* p) { m_slots.push_back(p); }
+    void append(T* p) {
+        m_slots.push_back(p);
+        if (p != nullptr) {
+            ++m_live;
+            if (m_index != nullptr)
+                m_index->add(p, getCount() - 1);
+        }
+    }
     // Sets the count (the storage is kept); new slots, if any, are null.
-    void reset(int count) { m_slots.resize(count > 0 ? static_cast<std::size_t>(count) : 0u); }
+    void reset(int count) {
+        std::size_t n = count > 0 ? static_cast<std::size_t>(count) : 0u;
+        for (std::size_t i = n; i < m_slots.size(); ++i)
+            if (m_slots[i] != nullptr)
+                --m_live;
+        m_slots.resize(n);
+        m_index.reset();
+        ++m_shape;
+    }
     // Removes slot i; the later slots move up by one.
     void removeAt(int i) {
-        if (i >= 0 && i < getCount())
-            m_slots.erase(m_slots.begin() + i);
+        if (i < 0 || i >= getCount())
+            return;
+        if (m_slots[static_cast<std::size_t>(i)] != nullptr)
+            --m_live;
+        m_slots.erase(m_slots.begin() + i);
+        m_index.reset();
+        ++m_shape;
+    }
+
+protected:
+    // How many slots hold a pointer.
+    int getLiveCount() const { return m_live; }
+    // The first slot holding p, or -1 (also for null).
+    int firstSlotOf(const T* p) const {
+        if (p == nullptr || m_live == 0)
+            return -1;
+        if (m_index == nullptr) {
+            if (getCount() <= kScanLimit) {
+                for (int i = 0; i < getCount(); ++i)
+                    if (m_slots[static_cast<std::size_t>(i)] == p)
+                        return i;
+                return -1;
+            }
+            buildIndex();
+        }
+        return m_index->first(p);
     }
 
 private:
+    friend class tsd_detail::LinkGraph;
+    friend class tsd_detail::NameIndex;
+
+    // Arrays up to this size are scanned; an index would cost more.
+    static constexpr int kScanLimit = 32;
+
+    void buildIndex() const {
+        m_index = std::make_unique<Tsd_SlotIndex>();
+        m_index->reserve(static_cast<std::size_t>(m_live));
+        for (int i = 0; i < getCount(); ++i)
+            if (T* p = m_slots[static_cast<std::size_t>(i)])
+                m_index->add(p, i);
+    }
+    // Changes whenever the array changes other than by appending or by
+    // clearing a slot.
+    std::uint32_t getShape() const { return m_shape; }
+
     std::vector<T*> m_slots;
+    std::int32_t m_live = 0;
+    std::uint32_t m_shape = 0;
+    mutable std::unique_ptr<Tsd_SlotIndex> m_index;
 };
 
 using DARRAY_Tsd_RefPtr = Tsd_DArray<Tsd_Ref>;

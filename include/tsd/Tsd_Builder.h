@@ -84,7 +84,7 @@ protected:
     // The prefix of parse messages (a "%z" argument); null sets it empty.
     void setContext(std::unique_ptr<char16_t[]> context);
     void setContext(const char16_t* context);
-    const char16_t* getContext() const { return m_context.c_str(); }
+    const char16_t* getContext() const;
 
     // Add to the counters; they stop at their largest and smallest values.
     void addError(short n);
@@ -114,8 +114,9 @@ private:
                             Result (Tsd_Builder::*process)(const char*, const char*));
     bool initUserGroupFromProp(Tsd_UserGroup* group, const char* value);
     Tsd_Spec* buildSpecFromProp(const char* name, const char* value);
-    // Removes the pending-link record of `spec`, if it has one.
-    void dropPendingLink(const Tsd_Spec* spec);
+    // Removes the pending-link record of `spec`, if it has one; `newest`
+    // says that spec was the last one parsed.
+    void dropPendingLink(const Tsd_Spec* spec, bool newest);
     Tsd_Spec* buildNetSpecFromProp(const char* name, const char* value);
     Tsd_Group* getSimpleGroup(const char* name, const char* value);
 
@@ -129,14 +130,23 @@ private:
     std::unique_ptr<Tsd_Design> m_ownedDesign;
     std::unique_ptr<Tsd_SpecGroupParser> m_specGroupParser;
     std::unique_ptr<Tsd_NetParser> m_netParser;
-    std::u16string m_context;
+    // The context, made from m_contextFormat and m_contextProp when it is
+    // first asked for: most properties never need theirs.
+    mutable std::u16string m_context;
+    mutable const char* m_contextFormat = nullptr;
+    const Tsd_Prop* m_contextProp = nullptr;
     std::unique_ptr<char16_t[]> m_objUserId;
     short m_numError = 0;
     short m_numWarning = 0;
     Tsd_BaseObjList m_unresolvedGroups{10};
+    // Finds placeholders by name; made on first use.
+    mutable std::unique_ptr<tsd_detail::NameIndex> m_unresolvedIndex;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_specProps;
     std::unique_ptr<DARRAY_Tsd_PropPtr> m_groupProps;
     DARRAY_Tsd_PendPtr m_pendingLinks;
+    // Where each spec's pending link record stands in m_pendingLinks; made
+    // when a record other than the newest is first dropped.
+    std::unique_ptr<Tsd_SlotIndex> m_pendingLinkSlot;
     Tsd_String m_pendingLinkTSid;
     DARRAY_Tsd_PendPtr m_pendingRegGroups;
     Tsd_String m_pendingRegGroupName;

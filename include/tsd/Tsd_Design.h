@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 
 #include "tsd/Tsd_BaseObj.h"
 #include "tsd/Tsd_Groups.h"
@@ -27,7 +28,8 @@ public:
 
 protected:
     // Called once for every object that trim() moves to trash, right after
-    // the move. The base does nothing; derive to log or count removals.
+    // the move. The base does nothing; derive to log or count removals. It
+    // must leave the design as it is: trim plans its cascade ahead.
     virtual void reportObjTrashed(Tsd_BaseObj* obj, TrimReason reason);
 
 public:
@@ -118,12 +120,19 @@ private:
         Tsd_BaseObjList trash{10};
     };
 
+    // The name indexes of the four finds, made on first use.
+    struct FindIndexes;
+    FindIndexes& findIndexes() const;
+
     // Moves obj from the active list to the trash; false if not active.
     static bool moveToTrash(ListPair& pair, Tsd_BaseObj* obj);
     void dumpList(DumpStream& stream, short indent, const ListPair& pair) const;
 
     int trimRefObjs(ListPair& pair);
     int trimUserGroups();
+    // Every pass of trimUserGroups until one trashes nothing, computed in
+    // one sweep; the same groups go in the same order.
+    int trimUserGroupsToTheEnd();
     void unlinkTrash();
 
     ListPair m_groups;
@@ -136,4 +145,5 @@ private:
     ListPair m_portSpecs;
     Tsd_String m_refType;
     Tsd_TIGGroup* m_globalTIG = nullptr;
+    mutable std::unique_ptr<FindIndexes> m_findIndexes;
 };

@@ -5,6 +5,7 @@
 #pragma once
 
 #include <cstdint>
+#include <vector>
 
 #include "tsd/Tsd_BaseObj.h"
 
@@ -17,7 +18,7 @@ public:
     void dump(DumpStream& stream, short indent) const override;
 
     const char* getName() const { return m_name.get(); }
-    void setName(const char* name) { m_name.set(name); }
+    void setName(const char* name);
 
 protected:
     explicit Tsd_Group(const char* name);
@@ -195,6 +196,11 @@ public:
 
 private:
     friend class Tsd_UserGroupIter;
+    friend class Tsd_Design;
+
+    // Removes every entry whose member is one of `members`, which is sorted
+    // by address; one pass however many members go.
+    void removeMembers(const std::vector<const Tsd_PredefGroup*>& members, bool exclude);
 
     Tsd_BaseObjList m_includes{10};
     Tsd_BaseObjList m_excludes{10};

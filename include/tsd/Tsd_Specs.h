@@ -53,7 +53,7 @@ public:
     Tsd_Spec* getSpec() override { return this; }
 
     const char* getTSid() const { return m_tsid.get(); }
-    void setTSid(const char* tsid) { m_tsid.set(tsid); }
+    void setTSid(const char* tsid);
     const char* getScope() const { return m_scope.get(); }
     void setScope(const char* scope) { m_scope.set(scope); }
 

@@ -2,6 +2,7 @@
 // into objects of the design.
 #include "tsd/Tsd_Builder.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Parsers.h"
@@ -111,10 +112,24 @@ void Tsd_Builder::setContext(std::unique_ptr<char16_t[]> context) {
 }
 
 void Tsd_Builder::setContext(const char16_t* context) {
+    m_contextFormat = nullptr;
     if (context == nullptr)
         m_context.clear();
     else
         m_context = context;
+}
+
+const char16_t* Tsd_Builder::getContext() const {
+    if (m_contextFormat != nullptr) {
+        std::unique_ptr<char16_t[]> context = translateMessage(
+            "TSDatabase", m_contextFormat, m_contextProp->name.get(), m_contextProp->value.get());
+        m_contextFormat = nullptr;
+        if (context == nullptr)
+            m_context.clear();
+        else
+            m_context = context.get();
+    }
+    return m_context.c_str();
 }
 
 void Tsd_Builder::addError(short n) {
@@ -329,14 +344,14 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
             if (!allowEndpointSpecOverride(existing, value)) {
                 // The refused spec may already wait for a link: that record
                 // goes with it.
-                dropPendingLink(spec);
+                dropPendingLink(spec, true);
                 delete spec;
                 return nullptr;
             }
             // The displaced spec goes to the trash, where pointers to it stay
             // valid and the design deletes it in the end.
             d.moveEndpointSpecToTrash(existing);
-            dropPendingLink(existing);
+            dropPendingLink(existing, false);
         }
         d.addEndpointSpec(endpoint);
     } else if (Tsd_Offset* offset = spec->getOffset()) {
@@ -347,13 +362,30 @@ Tsd_Spec* Tsd_Builder::processSpecProp(const char* name, const char* value) {
     return spec;
 }
 
-void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec) {
-    for (auto it = m_pendingLinks.begin(); it != m_pendingLinks.end(); ++it) {
-        if (*it != nullptr && (*it)->spec == spec) {
-            m_pendingLinks.erase(it);
-            return;
+void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec, bool newest) {
+    // The record's entry is cleared rather than erased: every reader skips
+    // cleared entries, and the positions of the others stay valid.
+    if (newest) {
+        // Its record, if any, is the last one made.
+        if (!m_pendingLinks.empty() && m_pendingLinks.back() != nullptr &&
+            m_pendingLinks.back()->spec == spec) {
+            if (m_pendingLinkSlot != nullptr)
+                m_pendingLinkSlot->remove(spec, static_cast<int>(m_pendingLinks.size() - 1));
+            m_pendingLinks.back().reset();
         }
+        return;
     }
+    if (m_pendingLinkSlot == nullptr) {
+        m_pendingLinkSlot = std::make_unique<Tsd_SlotIndex>();
+        for (std::size_t i = 0; i < m_pendingLinks.size(); ++i)
+            if (m_pendingLinks[i] != nullptr)
+                m_pendingLinkSlot->add(m_pendingLinks[i]->spec, static_cast<int>(i));
+    }
+    const int slot = m_pendingLinkSlot->first(spec);
+    if (slot < 0)
+        return;
+    m_pendingLinks[static_cast<std::size_t>(slot)].reset();
+    m_pendingLinkSlot->remove(spec, slot);
 }
 
 Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
@@ -405,6 +437,8 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
         Tsd_EndpointSpec* endpoint = spec->getEndpointSpec();
         if (endpoint == nullptr)
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
+        if (m_pendingLinkSlot != nullptr)
+            m_pendingLinkSlot->add(endpoint, static_cast<int>(m_pendingLinks.size()));
         m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
         m_pendingLinkTSid.set(nullptr);
     }

@@ -2,23 +2,149 @@
 // pending, and handing out the design when no error was counted.
 #include "tsd/Tsd_Builder.h"
 
+#include "internal/Tsd_GroupCircles.h"
+#include "internal/Tsd_LinkGraph.h"
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cstring>
 #include <string>
+#include <unordered_map>
+#include <vector>
 
 namespace {
 
-// The getUserString of each holder, copied at once: the text lives in a
-// buffer that the next getUserString overwrites.
-std::vector<std::string> userStrings(const Tsd_BaseObjList& list) {
-    std::vector<std::string> out;
-    Tsd_BaseObjListIter iter(&list);
-    while (Tsd_BaseObj* obj = iter.next())
-        out.emplace_back(obj->getUserString());
-    return out;
-}
+// The holders of several clock groups, as getGroupHolders lists them (the
+// offsets whose clock pad it is, then the port timings whose secondary group
+// it is, each in list order), gathered in one pass over the lists. Each
+// holder is kept as its getUserString, copied at once: that text lives in a
+// buffer that the next call overwrites.
+class ClockHolders {
+public:
+    ClockHolders(Tsd_Design& design, const std::vector<Tsd_ClkGroup*>& clocks) {
+        for (Tsd_ClkGroup* clock : clocks)
+            m_holders.emplace(clock, std::vector<std::string>());
+        Tsd_BaseObjListIter offsets(design.getOffsetSpecList());
+        while (Tsd_BaseObj* obj = offsets.next())
+            if (Tsd_Offset* offset = obj->getOffset())
+                add(offset->getClockPad(), obj);
+        Tsd_BaseObjListIter ports(design.getPortTimingList());
+        while (Tsd_BaseObj* obj = ports.next())
+            if (Tsd_PortTiming* port = obj->getPortTiming())
+                add(port->getSecondaryGroup(), obj);
+    }
+
+    const std::vector<std::string>& of(const Tsd_ClkGroup* clock) const {
+        return m_holders.at(clock);
+    }
+
+private:
+    void add(const Tsd_Group* group, Tsd_BaseObj* holder) {
+        auto it = m_holders.find(group);
+        if (it != m_holders.end())
+            it->second.emplace_back(holder->getUserString());
+    }
+
+    std::unordered_map<const Tsd_Group*, std::vector<std::string>> m_holders;
+};
+
+// What checkLink(true) reports for each spec of a list, with the walks of
+// the chains shared: every spec's outcome on arrival (the chain ends at a
+// delay, at an ignored spec, at a missing link, or runs into a circle) and
+// its first zero divisor are worked out once, so a chain of n specs costs n,
+// not n^2. A walk that ends in a fatal message or a circle listing is done
+// as checkLink does it: the listing is as long as the walk.
+class LinkChecker {
+public:
+    explicit LinkChecker(const Tsd_BaseObjList& specs)
+        : m_graph(specs), m_end(static_cast<std::size_t>(m_graph.size()), DELAY),
+          m_endAt(static_cast<std::size_t>(m_graph.size()), -1),
+          m_firstZero(static_cast<std::size_t>(m_graph.size()), -1),
+          m_divides(static_cast<std::size_t>(m_graph.size()), 0) {
+        std::vector<char> ignored(m_divides.size(), 0);
+        for (int id : m_graph.order()) {
+            m_divides[static_cast<std::size_t>(id)] = tsd_detail::dividesByZero(m_graph.spec(id));
+            ignored[static_cast<std::size_t>(id)] = m_graph.spec(id)->isIgnored();
+        }
+        // On a cycle the walk goes round until an ignored spec, if any.
+        for (int c = 0; c < m_graph.cycleCount(); ++c) {
+            const std::vector<int> cycle = m_graph.cycleNodes(c);
+            const std::size_t length = cycle.size();
+            const std::vector<int> toIgnored = tsd_detail::LinkGraph::distanceTo(cycle, ignored);
+            const std::vector<int> toZero = tsd_detail::LinkGraph::distanceTo(cycle, m_divides);
+            for (std::size_t k = 0; k < length; ++k) {
+                const auto node = static_cast<std::size_t>(cycle[k]);
+                const int di = toIgnored[k], dz = toZero[k];
+                if (di < 0) {
+                    m_end[node] = CIRCLE;
+                    continue;
+                }
+                m_end[node] = IGNORED;
+                m_endAt[node] = cycle[(k + static_cast<std::size_t>(di)) % length];
+                if (dz >= 0 && dz < di)
+                    m_firstZero[node] = cycle[(k + static_cast<std::size_t>(dz)) % length];
+            }
+        }
+        for (int id : m_graph.order()) {
+            const auto i = static_cast<std::size_t>(id);
+            const Tsd_EndpointSpec* spec = m_graph.spec(id);
+            const int next = m_graph.next(id);
+            if (m_graph.cycleOf(id) >= 0)
+                continue;
+            if (spec->hasDelayValue()) {
+                m_end[i] = DELAY;
+            } else if (spec->isIgnored()) {
+                m_end[i] = IGNORED;
+                m_endAt[i] = id;
+            } else if (next < 0) {
+                m_end[i] = MISSING;
+            } else {
+                const auto j = static_cast<std::size_t>(next);
+                m_end[i] = m_end[j];
+                m_endAt[i] = m_endAt[j];
+                m_firstZero[i] = m_divides[i] ? id : m_firstZero[j];
+            }
+        }
+    }
+
+    // What checkLink(true) returns and reports for the spec at `slot`.
+    int check(Tsd_EndpointSpec* spec, int slot) const {
+        if (spec->hasDelayValue() || spec->isIgnored())
+            return 0;
+        // Only linked specs are in the graph.
+        const int id = m_graph.idAt(slot, spec);
+        const int next = id >= 0 ? m_graph.next(id) : -1;
+        const End end = next >= 0 ? m_end[static_cast<std::size_t>(next)] : MISSING;
+        if (end == MISSING || end == CIRCLE)
+            return spec->checkLink(true);
+        int count = 0;
+        if (m_divides[static_cast<std::size_t>(id)]) {
+            tsd_detail::reportZeroDivisor(spec);
+            ++count;
+        }
+        for (int z = m_firstZero[static_cast<std::size_t>(next)]; z >= 0;
+             z = m_firstZero[static_cast<std::size_t>(m_graph.next(z))]) {
+            tsd_detail::reportZeroDivisor(m_graph.spec(z));
+            ++count;
+        }
+        if (end == IGNORED) {
+            tsd_detail::reportIgnoredLink(spec,
+                                          m_graph.spec(m_endAt[static_cast<std::size_t>(next)]));
+            ++count;
+        }
+        return count;
+    }
+
+private:
+    enum End : char { DELAY, IGNORED, MISSING, CIRCLE };
+
+    tsd_detail::LinkGraph m_graph;
+    std::vector<End> m_end;
+    std::vector<int> m_endAt;     // the ignored spec that ends the walk
+    std::vector<int> m_firstZero; // the first zero divisor before the end
+    std::vector<char> m_divides;
+};
 
 } // namespace
 
@@ -70,8 +196,11 @@ void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
         return;
     // Each message names the definition it comes from through the context.
     for (std::unique_ptr<Tsd_Prop>& prop : *props) {
-        setContext(translateMessage("TSDatabase", context, prop->name.get(), prop->value.get()));
+        // The context is made when a message first asks for it.
+        m_contextFormat = context;
+        m_contextProp = prop.get();
         (this->*process)(prop->name.get(), prop->value.get());
+        m_contextFormat = nullptr;
         prop.reset();
     }
     props.reset();
@@ -79,10 +208,13 @@ void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
 }
 
 void Tsd_Builder::validateUserGroups() {
+    // What one group's check learns about groups free of circles saves the
+    // checks of the others from walking them again.
+    tsd_detail::CircleSearchState state;
     Tsd_BaseObjListIter iter(design().getGroupList());
     while (Tsd_BaseObj* obj = iter.next())
         if (Tsd_UserGroup* group = obj->getUserGroup())
-            addErrorCount(group->checkInExcludes(true));
+            addErrorCount(tsd_detail::countCircles(group, true, state));
 }
 
 void Tsd_Builder::resolvePendingOffsets() {
@@ -122,19 +254,24 @@ void Tsd_Builder::resolvePendingOffsets() {
     if (referenceMode)
         return;
 
-    // Clock groups that a spec named but no TS_CLKGRP property defined.
+    // Clock groups that a spec named but no TS_CLKGRP property defined, each
+    // reported with the objects that hold it.
+    std::vector<Tsd_ClkGroup*> unreferenced;
     Tsd_BaseObjListIter clocks(d.getClockGroupList());
     while (Tsd_BaseObj* obj = clocks.next()) {
         Tsd_ClkGroup* clock = obj->getClkGroup();
-        if (clock == nullptr || !clock->getRefList()->isEmpty())
-            continue;
-        Tsd_BaseObjList holders;
-        d.getGroupHolders(clock, &holders);
+        if (clock != nullptr && clock->getRefList()->isEmpty())
+            unreferenced.push_back(clock);
+    }
+    if (unreferenced.empty())
+        return;
+    const ClockHolders holders(d, unreferenced);
+    for (Tsd_ClkGroup* clock : unreferenced) {
         Message msg = TSD_MSG();
         msg.error("The following spec(s) referenced the Tsd_ClkGroup \"%s\", but no such TS_CLKGRP "
                   "reference property was added to the builder:\n",
                   clock->getName());
-        for (const std::string& holder : userStrings(holders))
+        for (const std::string& holder : holders.of(clock))
             msg.status("   %s\n", holder.c_str());
         countError();
     }
@@ -161,10 +298,13 @@ void Tsd_Builder::resolvePendingLinks() {
     }
     if (failed)
         return;
-    Tsd_BaseObjListIter iter(d.getEndpointSpecList());
-    while (Tsd_BaseObj* obj = iter.next())
-        if (Tsd_EndpointSpec* spec = obj->getEndpointSpec())
-            addErrorCount(spec->checkLink(true));
+    const Tsd_BaseObjList& specs = *d.getEndpointSpecList();
+    LinkChecker checker(specs);
+    for (int slot = 0; slot < specs.getCount(); ++slot) {
+        Tsd_BaseObj* obj = specs.getAt(slot);
+        if (Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr)
+            addErrorCount(checker.check(spec, slot));
+    }
 }
 
 void Tsd_Builder::installTIGs() {

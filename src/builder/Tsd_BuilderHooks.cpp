@@ -2,22 +2,24 @@
 // clock nets and specifications that a constraint names.
 #include "tsd/Tsd_Builder.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_Report.h"
 
-#include <cstring>
 #include <string>
 
 Tsd_UserGroup* Tsd_Builder::findUnresolvedGroupByName(const char* name) const {
     if (name == nullptr)
         return nullptr;
-    Tsd_BaseObjListIter iter(&m_unresolvedGroups);
-    while (Tsd_BaseObj* obj = iter.next()) {
-        Tsd_UserGroup* group = obj->getUserGroup();
-        if (group != nullptr && group->getName() != nullptr &&
-            std::strcmp(group->getName(), name) == 0)
-            return group;
+    if (m_unresolvedIndex == nullptr) {
+        // Whatever else a user builder puts in the list is passed over.
+        m_unresolvedIndex = std::make_unique<tsd_detail::NameIndex>(
+            [](Tsd_BaseObj* obj, bool& /*foreign*/) -> const char* {
+                Tsd_UserGroup* group = obj->getUserGroup();
+                return group != nullptr ? group->getName() : nullptr;
+            });
     }
-    return nullptr;
+    int slot = m_unresolvedIndex->find(m_unresolvedGroups, name).slot;
+    return slot >= 0 ? m_unresolvedGroups.getAt(slot)->getUserGroup() : nullptr;
 }
 
 const char16_t* Tsd_Builder::getObjUserId(Tsd_BaseObj* obj) {

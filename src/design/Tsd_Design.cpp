@@ -1,20 +1,52 @@
 // The design container: typed lists with trash lists, finds and the dump.
 #include "tsd/Tsd_Design.h"
 
+#include "internal/Tsd_NameIndex.h"
+#include "internal/Tsd_Once.h"
 #include "internal/Tsd_Report.h"
 
-#include <cstring>
-#include <unordered_set>
+#include <utility>
+#include <vector>
 
 namespace {
 
+using tsd_detail::NameIndex;
+
 const char* kGlobalTIGName = "global";
 
-bool sameName(const char* a, const char* b) {
-    return a != nullptr && b != nullptr && std::strcmp(a, b) == 0;
+// The key of an element of a typed list: the name (or TSid) of what the
+// list's downcast gives; an element it refuses is foreign.
+template <class T, T* (Tsd_BaseObj::*Cast)(), class Keyed, const char* (Keyed::*Key)() const>
+const char* keyOf(Tsd_BaseObj* obj, bool& foreign) {
+    T* typed = (obj->*Cast)();
+    foreign = typed == nullptr;
+    return typed != nullptr ? (typed->*Key)() : nullptr;
 }
 
+// An index for a list and one for its trash.
+struct IndexPair {
+    explicit IndexPair(NameIndex::KeyOf keyOf) : active(keyOf), trash(keyOf) {}
+    NameIndex active;
+    NameIndex trash;
+};
+
 } // namespace
+
+struct Tsd_Design::FindIndexes {
+    IndexPair groups{keyOf<Tsd_Group, &Tsd_BaseObj::getGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair clockGroups{
+        keyOf<Tsd_ClkGroup, &Tsd_BaseObj::getClkGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair tigGroups{
+        keyOf<Tsd_TIGGroup, &Tsd_BaseObj::getTIGGroup, Tsd_Group, &Tsd_Group::getName>};
+    IndexPair endpointSpecs{
+        keyOf<Tsd_EndpointSpec, &Tsd_BaseObj::getEndpointSpec, Tsd_Spec, &Tsd_Spec::getTSid>};
+};
+
+Tsd_Design::FindIndexes& Tsd_Design::findIndexes() const {
+    if (m_findIndexes == nullptr)
+        m_findIndexes = std::make_unique<FindIndexes>();
+    return *m_findIndexes;
+}
 
 void Tsd_Design::reportObjTrashed(Tsd_BaseObj* /*obj*/, TrimReason /*reason*/) {}
 
@@ -24,17 +56,17 @@ Tsd_Design::~Tsd_Design() {
     // Every object dies exactly once, in list order, pair by pair. An object
     // that a caller added twice (the add operations do not check) is
     // deleted at its first occurrence only.
-    std::unordered_set<const Tsd_BaseObj*> deleted;
+    std::vector<Tsd_BaseObj*> objects;
     for (ListPair* pair : {&m_groups, &m_clockGroups, &m_tigGroups, &m_endpointSpecs,
-                           &m_offsetSpecs, &m_netSpecs, &m_pathControls, &m_portSpecs}) {
-        for (Tsd_BaseObjList* list : {&pair->active, &pair->trash}) {
-            for (int i = 0; i < list->getCount(); ++i) {
-                Tsd_BaseObj* obj = list->getAt(i);
-                if (obj != nullptr && deleted.insert(obj).second)
-                    delete obj;
-            }
-        }
-    }
+                           &m_offsetSpecs, &m_netSpecs, &m_pathControls, &m_portSpecs})
+        for (Tsd_BaseObjList* list : {&pair->active, &pair->trash})
+            for (int i = 0; i < list->getCount(); ++i)
+                if (Tsd_BaseObj* obj = list->getAt(i))
+                    objects.push_back(obj);
+    tsd_detail::FirstSeen<Tsd_BaseObj> firstSeen(objects);
+    for (Tsd_BaseObj* obj : objects)
+        if (firstSeen(obj))
+            delete obj;
 }
 
 bool Tsd_Design::moveToTrash(ListPair& pair, Tsd_BaseObj* obj) {
@@ -127,23 +159,22 @@ bool Tsd_Design::isPortTimingTrashed(const Tsd_PortTiming* spec) const {
 
 namespace {
 
-// The first element of the active list (then, when asked, of the trash) that
-// casts to T and whose key equals `key`; an element of another class is a
-// broken invariant.
-template <class T, class Cast, class Key>
-T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, bool includeTrash,
-          const char* key, Cast cast, Key keyOf, const char* wrongClassMessage) {
-    for (const Tsd_BaseObjList* list : {&active, &trash}) {
-        if (list == &trash && !includeTrash)
+// The first element of the active list (then, when asked, of the trash) whose
+// key equals `key`, as a walk in list order finds it: an element of another
+// class met on the way is a broken invariant.
+template <class T, T* (Tsd_BaseObj::*Cast)()>
+T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, IndexPair& indexes,
+          bool includeTrash, const char* key, const char* wrongClassMessage) {
+    const std::pair<const Tsd_BaseObjList*, NameIndex*> lists[] = {{&active, &indexes.active},
+                                                                   {&trash, &indexes.trash}};
+    for (const auto& list : lists) {
+        if (list.first == &trash && !includeTrash)
             break;
-        Tsd_BaseObjListIter iter(list);
-        while (Tsd_BaseObj* obj = iter.next()) {
-            T* typed = cast(obj);
-            if (typed == nullptr)
-                TSD_MSG().fatal(2, "%s", wrongClassMessage);
-            if (sameName(keyOf(typed), key))
-                return typed;
-        }
+        NameIndex::Hit hit = list.second->find(*list.first, key);
+        if (hit.foreignBefore)
+            TSD_MSG().fatal(2, "%s", wrongClassMessage);
+        if (hit.slot >= 0)
+            return (list.first->getAt(hit.slot)->*Cast)();
     }
     return nullptr;
 }
@@ -151,33 +182,29 @@ T* findIn(const Tsd_BaseObjList& active, const Tsd_BaseObjList& trash, bool incl
 } // namespace
 
 Tsd_Group* Tsd_Design::findGroupByUserName(const char* name, bool includeTrash) const {
-    return findIn<Tsd_Group>(
-        m_groups.active, m_groups.trash, includeTrash, name,
-        [](Tsd_BaseObj* o) { return o->getGroup(); }, [](Tsd_Group* g) { return g->getName(); },
-        "Non-group object.\n");
+    return findIn<Tsd_Group, &Tsd_BaseObj::getGroup>(m_groups.active, m_groups.trash,
+                                                     findIndexes().groups, includeTrash, name,
+                                                     "Non-group object.\n");
 }
 
 Tsd_ClkGroup* Tsd_Design::findClockGroupByNetName(const char* netName, bool includeTrash) const {
-    return findIn<Tsd_ClkGroup>(
-        m_clockGroups.active, m_clockGroups.trash, includeTrash, netName,
-        [](Tsd_BaseObj* o) { return o->getClkGroup(); },
-        [](Tsd_ClkGroup* g) { return g->getName(); }, "Non-clock group object.\n");
+    return findIn<Tsd_ClkGroup, &Tsd_BaseObj::getClkGroup>(
+        m_clockGroups.active, m_clockGroups.trash, findIndexes().clockGroups, includeTrash, netName,
+        "Non-clock group object.\n");
 }
 
 Tsd_TIGGroup* Tsd_Design::findTIGByTSid(const char* tsid, bool includeTrash) const {
     if (tsid == nullptr || *tsid == 0)
         tsid = kGlobalTIGName;
-    return findIn<Tsd_TIGGroup>(
-        m_tigGroups.active, m_tigGroups.trash, includeTrash, tsid,
-        [](Tsd_BaseObj* o) { return o->getTIGGroup(); },
-        [](Tsd_TIGGroup* g) { return g->getName(); }, "Non-TIG object.\n");
+    return findIn<Tsd_TIGGroup, &Tsd_BaseObj::getTIGGroup>(m_tigGroups.active, m_tigGroups.trash,
+                                                           findIndexes().tigGroups, includeTrash,
+                                                           tsid, "Non-TIG object.\n");
 }
 
 Tsd_EndpointSpec* Tsd_Design::findEndpointSpecByTSid(const char* tsid, bool includeTrash) const {
-    return findIn<Tsd_EndpointSpec>(
-        m_endpointSpecs.active, m_endpointSpecs.trash, includeTrash, tsid,
-        [](Tsd_BaseObj* o) { return o->getEndpointSpec(); },
-        [](Tsd_EndpointSpec* s) { return s->getTSid(); }, "Non-endpoint spec object.\n");
+    return findIn<Tsd_EndpointSpec, &Tsd_BaseObj::getEndpointSpec>(
+        m_endpointSpecs.active, m_endpointSpecs.trash, findIndexes().endpointSpecs, includeTrash,
+        tsid, "Non-endpoint spec object.\n");
 }
 
 void Tsd_Design::dumpList(DumpStream& stream, short indent, const ListPair& pair) const {

@@ -2,8 +2,14 @@
 // survivors from the trash, and listing the holders of a group.
 #include "tsd/Tsd_Design.h"
 
+#include "internal/Tsd_LinkGraph.h"
 #include "internal/Tsd_Report.h"
 
+#include <algorithm>
+#include <cstdint>
+#include <functional>
+#include <queue>
+#include <utility>
 #include <vector>
 
 namespace {
@@ -28,36 +34,315 @@ bool hasMember(const Tsd_UserGroup* user, const Tsd_Group* group) {
     return false;
 }
 
-// Whether `spec`'s delay can be computed through its link chain, and whether
-// a spec on that chain is trashed. A chain that ends without a delay, meets a
-// zero divisor or runs into a cycle cannot be computed.
-struct ChainState {
-    bool computable = false;
-    bool touchesTrash = false;
-};
-
-ChainState examineChain(const Tsd_EndpointSpec* spec, const Tsd_BaseObjList& trash) {
-    ChainState state;
-    std::vector<const Tsd_EndpointSpec*> visited{spec};
-    const Tsd_EndpointSpec* current = spec;
-    while (current->isLinked()) {
-        const Tsd_EndpointSpec::LinkData* link = current->getLinkData();
-        if (!link->multiply && link->factor == 0.0)
-            return state;
-        const Tsd_EndpointSpec* next = link->spec;
-        if (next == nullptr)
-            return state;
-        for (const Tsd_EndpointSpec* seen : visited)
-            if (seen == next)
-                return state;
-        visited.push_back(next);
-        if (trash.contains(next))
-            state.touchesTrash = true;
-        current = next;
-    }
-    state.computable = current->hasDelayValue();
-    return state;
+// The members that a walk of one member list meets and that are in `trash`,
+// sorted by address, each once.
+std::vector<const Tsd_PredefGroup*> trashedMembers(const Tsd_UserGroup* group, bool exclude,
+                                                   const Tsd_BaseObjList& trash) {
+    std::vector<const Tsd_PredefGroup*> found;
+    Tsd_UserGroupIter members(group, exclude);
+    Tsd_UserGroup::Edge edge;
+    while (Tsd_PredefGroup* member = members.next(edge))
+        if (trash.contains(member))
+            found.push_back(member);
+    std::sort(found.begin(), found.end(), std::less<const Tsd_PredefGroup*>());
+    found.erase(std::unique(found.begin(), found.end()), found.end());
+    return found;
 }
+
+// Freezes, spec by spec in list order, the delay of every spec whose link
+// chain passes through the trash, as a walk of each chain would:
+//
+//   a spec whose link check fails is passed over (a debug trace says so);
+//   a linked spec whose chain meets a trashed spec and can be computed gets
+//   its computed delay as its own, which cuts its link.
+//
+// A frozen spec ends the chains that pass through it from then on, so the
+// outcome depends on the order of the list. Chains that end at a delay form
+// a forest rooted at those delays; a spec's chain now ends at its nearest
+// frozen ancestor, found through an Euler tour of the forest and a segment
+// tree of the marks that freezing adds. What a walk would meet on the way,
+// zero divisors, ignored specs and trashed specs, comes from counts summed
+// along the forest. Chains that end at an unresolved link or run into a
+// cycle never meet a frozen spec, so their outcome is fixed and memoised.
+class LinkFreezer {
+public:
+    LinkFreezer(const Tsd_BaseObjList& specs, const Tsd_BaseObjList& trash) : m_graph(specs) {
+        const auto n = static_cast<std::size_t>(m_graph.size());
+        m_root.assign(n, -1);
+        m_zero.assign(n, 0);
+        m_ignored.assign(n, 0);
+        m_trashed.assign(n, 0);
+        m_haveValue.assign(n, 0);
+        m_fatalAhead.assign(n, 0);
+        m_trashAhead.assign(n, 0);
+        m_firstZero.assign(n, -1);
+        m_divides.assign(n, 0);
+        std::vector<char> trashed(n);
+        for (int id : m_graph.order()) {
+            m_divides[static_cast<std::size_t>(id)] = tsd_detail::dividesByZero(m_graph.spec(id));
+            trashed[static_cast<std::size_t>(id)] = trash.contains(m_graph.spec(id));
+        }
+        const std::vector<char>& zero = m_divides;
+        examineCycles(zero, trashed);
+        for (int id : m_graph.order()) {
+            const auto i = static_cast<std::size_t>(id);
+            const Tsd_EndpointSpec* spec = m_graph.spec(id);
+            const int next = m_graph.next(id);
+            const bool ignored = spec->isIgnored();
+            if (m_graph.cycleOf(id) >= 0)
+                continue;
+            const auto j = static_cast<std::size_t>(next >= 0 ? next : 0);
+            // Arriving at this spec, a walk of checkLink ends in a fatal
+            // message: no delay, not ignored, and no link to follow.
+            m_fatalAhead[i] = !spec->hasDelayValue() && !ignored &&
+                              (next < 0 || (m_graph.cycleOf(next) < 0 && m_fatalAhead[j] != 0));
+            // Arriving here, the walk of the chain meets a trashed spec
+            // before it stops at a zero divisor, an unresolved link or the
+            // end of the chain.
+            m_trashAhead[i] = trashed[i] || (next >= 0 && !zero[i] && m_trashAhead[j] != 0);
+            if (spec->hasDelayValue()) {
+                m_root[i] = id;
+                m_ignored[i] = ignored;
+                m_trashed[i] = trashed[i];
+            } else if (next >= 0 && m_root[j] >= 0) {
+                m_root[i] = m_root[j];
+                m_zero[i] = zero[i] + m_zero[j];
+                m_ignored[i] = ignored + m_ignored[j];
+                m_trashed[i] = trashed[i] + m_trashed[j];
+                m_firstZero[i] = zero[i] ? id : m_firstZero[j];
+            }
+        }
+        buildTour();
+    }
+
+    // Steps a and b for the spec at `slot` of the list; false when its link
+    // check fails, which also skips the rest of the spec's unlinking.
+    bool visit(Tsd_EndpointSpec* spec, int slot) {
+        if (spec->hasDelayValue())
+            return true;
+        // Only linked specs are in the graph.
+        const int id = m_graph.idAt(slot, spec);
+        const int next = id >= 0 ? m_graph.next(id) : -1;
+        if (next < 0) {
+            // Nothing to follow: fine for an ignored spec, else the link
+            // check ends in its fatal message.
+            if (!spec->isIgnored())
+                spec->checkLink(false);
+            return true;
+        }
+        const auto i = static_cast<std::size_t>(id);
+        const auto j = static_cast<std::size_t>(next);
+        if (m_root[i] < 0) {
+            // The chain never reaches a delay, and nothing on it is frozen.
+            if (spec->isIgnored()) {
+                bool onCycle = m_graph.cycleOf(id) >= 0;
+                if (!m_divides[i] && (onCycle ? m_trashAfter[i] != 0 : m_trashAhead[j] != 0))
+                    traceFailure(spec);
+                return true;
+            }
+            if (m_graph.cycleOf(next) < 0 && m_fatalAhead[j])
+                spec->checkLink(false);
+            traceFailure(spec);
+            return false;
+        }
+        const int end = chainEnd(id);
+        const auto e = static_cast<std::size_t>(end);
+        const int zeros = m_zero[i] - m_zero[e];
+        const bool touchesTrash = m_trashed[j] - m_trashed[e] + trashedAt(end) > 0;
+        if (!spec->isIgnored()) {
+            if (zeros > 0 || m_ignored[j] - m_ignored[e] > 0) {
+                traceFailure(spec);
+                return false;
+            }
+            if (touchesTrash)
+                freeze(id);
+            return true;
+        }
+        // An ignored spec passes the link check whatever its chain holds; its
+        // delay is only frozen when the chain can be computed.
+        if (zeros == 0) {
+            if (touchesTrash)
+                freeze(id);
+        } else {
+            // The walk stops at the first zero divisor (this spec's own
+            // counts nothing, as the sums cancel).
+            const int zero = m_firstZero[i];
+            const auto z = static_cast<std::size_t>(zero);
+            if (m_trashed[j] - m_trashed[z] + trashedAt(zero) > 0)
+                traceFailure(spec);
+        }
+        return true;
+    }
+
+private:
+    static void traceFailure(const Tsd_EndpointSpec* spec) {
+        MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+    }
+
+    int trashedAt(int id) const {
+        const auto i = static_cast<std::size_t>(id);
+        const int next = m_graph.next(id);
+        return m_trashed[i] -
+               (next >= 0 && m_root[i] != id ? m_trashed[static_cast<std::size_t>(next)] : 0);
+    }
+
+    // For a spec on a cycle, whether the walk from it meets a trashed spec
+    // before a zero divisor or its way back.
+    void examineCycles(const std::vector<char>& zero, const std::vector<char>& trashed) {
+        m_trashAfter.assign(static_cast<std::size_t>(m_graph.size()), 0);
+        for (int c = 0; c < m_graph.cycleCount(); ++c) {
+            const std::vector<int> cycle = m_graph.cycleNodes(c);
+            const int length = static_cast<int>(cycle.size());
+            const std::vector<int> toZero = tsd_detail::LinkGraph::distanceTo(cycle, zero);
+            std::vector<int> trashBefore(2 * cycle.size() + 1, 0);
+            for (int k = 0; k < 2 * length; ++k)
+                trashBefore[static_cast<std::size_t>(k) + 1] =
+                    trashBefore[static_cast<std::size_t>(k)] +
+                    trashed[static_cast<std::size_t>(cycle[static_cast<std::size_t>(k % length)])];
+            for (int k = 0; k < length; ++k) {
+                const auto node = static_cast<std::size_t>(cycle[static_cast<std::size_t>(k)]);
+                const int d = toZero[static_cast<std::size_t>(k)];
+                const int last = k + (d >= 0 ? d : length - 1);
+                const int after = trashBefore[static_cast<std::size_t>(last) + 1] -
+                                  trashBefore[static_cast<std::size_t>(k) + 1];
+                m_trashAfter[node] = after > 0;
+                m_trashAhead[node] = trashed[node] || after > 0;
+            }
+        }
+    }
+
+    // The Euler tour of the forest of chains that end at a delay: a subtree
+    // takes the positions from its root's on, as many as it has nodes, so
+    // sizes summed from the leaves up place every node, parents first.
+    void buildTour() {
+        const auto n = static_cast<std::size_t>(m_graph.size());
+        const std::vector<int>& order = m_graph.order();
+        auto inForest = [&](int id) { return m_root[static_cast<std::size_t>(id)] >= 0; };
+        auto isRoot = [&](int id) { return m_root[static_cast<std::size_t>(id)] == id; };
+        std::vector<int> size(n, 1);
+        for (auto it = order.rbegin(); it != order.rend(); ++it)
+            if (inForest(*it) && !isRoot(*it))
+                size[static_cast<std::size_t>(m_graph.next(*it))] +=
+                    size[static_cast<std::size_t>(*it)];
+        m_enter.assign(n, 0);
+        m_depth.assign(n, 0);
+        std::vector<int> nextFree(n, 0); // the next position for a child
+        int time = 0;
+        for (int id : order) {
+            const auto i = static_cast<std::size_t>(id);
+            if (!inForest(id))
+                continue;
+            if (isRoot(id)) {
+                m_enter[i] = time;
+                time += size[i];
+            } else {
+                const auto parent = static_cast<std::size_t>(m_graph.next(id));
+                m_enter[i] = nextFree[parent];
+                nextFree[parent] += size[i];
+                m_depth[i] = m_depth[parent] + 1;
+            }
+            nextFree[i] = m_enter[i] + 1;
+        }
+        for (std::size_t i = 0; i < n; ++i)
+            size[i] += m_enter[i];
+        m_leave = std::move(size);
+        m_tourSize = time;
+        m_marks.assign(2 * static_cast<std::size_t>(time), -1);
+    }
+
+    // Where the chain of `id` now ends: its nearest frozen ancestor, else its
+    // root.
+    int chainEnd(int id) const {
+        int best = -1;
+        for (auto p = static_cast<std::size_t>(m_enter[static_cast<std::size_t>(id)] + m_tourSize);
+             p >= 1; p >>= 1) {
+            int mark = m_marks[p];
+            if (mark >= 0 && (best < 0 || m_depth[static_cast<std::size_t>(mark)] >
+                                              m_depth[static_cast<std::size_t>(best)]))
+                best = mark;
+        }
+        return best >= 0 ? best : m_root[static_cast<std::size_t>(id)];
+    }
+
+    void mark(int id) {
+        std::size_t lo =
+            static_cast<std::size_t>(m_enter[static_cast<std::size_t>(id)] + m_tourSize);
+        std::size_t hi =
+            static_cast<std::size_t>(m_leave[static_cast<std::size_t>(id)] + m_tourSize);
+        const int depth = m_depth[static_cast<std::size_t>(id)];
+        auto put = [&](std::size_t p) {
+            if (m_marks[p] < 0 || m_depth[static_cast<std::size_t>(m_marks[p])] < depth)
+                m_marks[p] = id;
+        };
+        for (; lo < hi; lo >>= 1, hi >>= 1) {
+            if (lo & 1)
+                put(lo++);
+            if (hi & 1)
+                put(--hi);
+        }
+    }
+
+    // The delay that getDelayValue() gives: the same operations in the same
+    // order, each link applied to the value of the spec it links to.
+    Tsd_TimeValue value(int id) {
+        if (m_values.empty())
+            m_values.resize(static_cast<std::size_t>(m_graph.size()));
+        std::vector<int> pending;
+        int x = id;
+        while (!m_haveValue[static_cast<std::size_t>(x)] && !m_graph.spec(x)->hasDelayValue()) {
+            pending.push_back(x);
+            x = m_graph.next(x);
+        }
+        if (!m_haveValue[static_cast<std::size_t>(x)]) {
+            m_values[static_cast<std::size_t>(x)] = m_graph.spec(x)->getDelayValue();
+            m_haveValue[static_cast<std::size_t>(x)] = 1;
+        }
+        for (auto it = pending.rbegin(); it != pending.rend(); ++it) {
+            const Tsd_EndpointSpec::LinkData& link = *m_graph.spec(*it)->getLinkData();
+            Tsd_TimeValue v = m_values[static_cast<std::size_t>(m_graph.next(*it))];
+            if (link.multiply)
+                v.value *= link.factor;
+            else
+                v.value /= link.factor;
+            m_values[static_cast<std::size_t>(*it)] = v;
+            m_haveValue[static_cast<std::size_t>(*it)] = 1;
+        }
+        return m_values[static_cast<std::size_t>(id)];
+    }
+
+    void freeze(int id) {
+        Tsd_EndpointSpec* spec = m_graph.spec(id);
+        spec->setDelayValue(value(id));
+        Tsd_Period* period = spec->getPeriod();
+        if (period != nullptr && period->hasPhase())
+            period->setPhase(Tsd_TimeValue(), true);
+        mark(id);
+    }
+
+    tsd_detail::LinkGraph m_graph;
+    // Per spec of a chain that ends at a delay: that delay's spec, and the
+    // zero divisors, ignored specs and trashed specs from it to there.
+    std::vector<int> m_root;
+    std::vector<int> m_zero;
+    std::vector<int> m_ignored;
+    std::vector<int> m_trashed;
+    std::vector<int> m_firstZero;
+    // Per spec: whether its link divides by zero; for the specs of other
+    // chains, the outcomes described where they are set.
+    std::vector<char> m_divides;
+    std::vector<char> m_fatalAhead;
+    std::vector<char> m_trashAhead;
+    std::vector<char> m_trashAfter;
+    // The tour: entry and exit times, depths, and the segment tree whose
+    // nodes hold the deepest frozen spec whose subtree covers them.
+    std::vector<int> m_enter;
+    std::vector<int> m_leave;
+    std::vector<int> m_depth;
+    int m_tourSize = 0;
+    std::vector<int> m_marks;
+    std::vector<Tsd_TimeValue> m_values;
+    std::vector<char> m_haveValue;
+};
 
 } // namespace
 
@@ -88,6 +373,113 @@ int Tsd_Design::trimUserGroups() {
     return count;
 }
 
+int Tsd_Design::trimUserGroupsToTheEnd() {
+    // Pass after pass, a user group goes at its own place in the list as
+    // soon as its last included member has gone: in the same pass when that
+    // member stands before it, else in the next. So the time of every event,
+    // (pass, slot), follows from the times of the members, and processing
+    // events in time order gives the same groups in the same order as the
+    // passes would, with work for each group and member only once.
+    const Tsd_BaseObjList& active = m_groups.active;
+    const Tsd_BaseObjList& trash = m_groups.trash;
+    struct Node {
+        Tsd_UserGroup* group;
+        int slot;
+        int waitingFor; // members not yet trashed; -1: one never will be
+    };
+    std::vector<Node> nodes;
+    for (int slot = 0; slot < active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = active.getAt(slot);
+        if (Tsd_UserGroup* group = obj != nullptr ? obj->getUserGroup() : nullptr)
+            nodes.push_back({group, slot, 0});
+    }
+    std::vector<std::pair<const Tsd_BaseObj*, int>> byAddress;
+    byAddress.reserve(nodes.size());
+    for (std::size_t k = 0; k < nodes.size(); ++k)
+        byAddress.emplace_back(nodes[k].group, static_cast<int>(k));
+    std::sort(byAddress.begin(), byAddress.end(),
+              [](const auto& a, const auto& b) { return std::less<>()(a.first, b.first); });
+
+    // A group listed twice is met by the passes at two places: such a design
+    // is trimmed pass by pass.
+    bool plain = true;
+    for (std::size_t k = 1; k < byAddress.size() && plain; ++k)
+        plain = byAddress[k].first != byAddress[k - 1].first;
+    if (!plain) {
+        int count = 0;
+        for (int n = trimUserGroups(); n != 0; n = trimUserGroups())
+            count += n;
+        return count;
+    }
+
+    auto nodeOf = [&](const Tsd_BaseObj* obj) {
+        auto it = std::lower_bound(
+            byAddress.begin(), byAddress.end(), obj,
+            [](const auto& entry, const Tsd_BaseObj* p) { return std::less<>()(entry.first, p); });
+        return it != byAddress.end() && it->first == obj ? it->second : -1;
+    };
+    // Who waits for whom: for each listed user group, the groups that
+    // include it, once per entry.
+    std::vector<std::pair<int, int>> waits; // (member, includer)
+    for (std::size_t k = 0; k < nodes.size(); ++k) {
+        Tsd_UserGroupIter members(nodes[k].group, false);
+        Tsd_UserGroup::Edge edge;
+        while (Tsd_PredefGroup* member = members.next(edge)) {
+            if (trash.contains(member))
+                continue;
+            int m = nodeOf(member);
+            if (m < 0) {
+                nodes[k].waitingFor = -1;
+                break;
+            }
+            ++nodes[k].waitingFor;
+            waits.emplace_back(m, static_cast<int>(k));
+        }
+    }
+    std::vector<int> firstWaiter(nodes.size() + 1, 0);
+    for (const auto& w : waits)
+        ++firstWaiter[static_cast<std::size_t>(w.first) + 1];
+    for (std::size_t k = 1; k < firstWaiter.size(); ++k)
+        firstWaiter[k] += firstWaiter[k - 1];
+    std::vector<int> waiters(waits.size());
+    {
+        std::vector<int> fill(firstWaiter.begin(), firstWaiter.end() - 1);
+        for (const auto& w : waits)
+            waiters[static_cast<std::size_t>(fill[static_cast<std::size_t>(w.first)]++)] = w.second;
+    }
+    waits.clear();
+    waits.shrink_to_fit();
+
+    // Events by (pass, slot), earliest first.
+    using Event = std::pair<std::uint64_t, int>;
+    auto at = [](std::uint64_t pass, int slot) {
+        return (pass << 32) | static_cast<std::uint32_t>(slot);
+    };
+    std::priority_queue<Event, std::vector<Event>, std::greater<Event>> events;
+    for (std::size_t k = 0; k < nodes.size(); ++k)
+        if (nodes[k].waitingFor == 0)
+            events.emplace(at(1, nodes[k].slot), static_cast<int>(k));
+    int count = 0;
+    while (!events.empty()) {
+        const std::uint64_t pass = events.top().first >> 32;
+        const Node& node = nodes[static_cast<std::size_t>(events.top().second)];
+        const int k = events.top().second;
+        events.pop();
+        if (!moveToTrash(m_groups, node.group))
+            continue;
+        reportObjTrashed(node.group, TRIM_EMPTY_USER_GROUP);
+        ++count;
+        for (int w = firstWaiter[static_cast<std::size_t>(k)];
+             w < firstWaiter[static_cast<std::size_t>(k) + 1]; ++w) {
+            Node& waiter = nodes[static_cast<std::size_t>(waiters[static_cast<std::size_t>(w)])];
+            if (waiter.waitingFor > 0 && --waiter.waitingFor == 0)
+                events.emplace(at(waiter.slot > node.slot ? pass : pass + 1, waiter.slot),
+                               waiters[static_cast<std::size_t>(w)]);
+        }
+    }
+    return count;
+}
+
 bool Tsd_Design::trim() {
     int count = 0;
 
@@ -98,8 +490,7 @@ bool Tsd_Design::trim() {
 
     // 2. User groups, until a pass finds nothing: one trashed in a pass can
     // empty another that was walked before it.
-    for (int n = trimUserGroups(); n != 0; n = trimUserGroups())
-        count += n;
+    count += trimUserGroupsToTheEnd();
 
     // 3. Endpoint specs whose groups are gone.
     Tsd_BaseObjListIter specs(&m_endpointSpecs.active);
@@ -184,44 +575,32 @@ bool Tsd_Design::trim() {
 }
 
 void Tsd_Design::unlinkTrash() {
-    // 1. Trashed members leave the user groups that survive.
+    // 1. Trashed members leave the user groups that survive, every entry of
+    // each at once.
     Tsd_BaseObjListIter groups(&m_groups.active);
     while (Tsd_BaseObj* obj = groups.next()) {
         Tsd_UserGroup* group = obj->getUserGroup();
         if (group == nullptr)
             continue;
         for (bool exclude : {false, true}) {
-            Tsd_UserGroupIter members(group, exclude);
-            Tsd_UserGroup::Edge edge;
-            while (Tsd_PredefGroup* member = members.next(edge))
-                if (isGroupTrashed(member))
-                    group->removeGroup(member, exclude);
+            std::vector<const Tsd_PredefGroup*> gone =
+                trashedMembers(group, exclude, m_groups.trash);
+            if (!gone.empty())
+                group->removeMembers(gone, exclude);
         }
     }
 
     // 2. Endpoint specs linked into the trash keep their computed delay.
-    Tsd_BaseObjListIter specs(&m_endpointSpecs.active);
-    while (Tsd_BaseObj* obj = specs.next()) {
+    LinkFreezer freezer(m_endpointSpecs.active, m_endpointSpecs.trash);
+    for (int slot = 0; slot < m_endpointSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_endpointSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_EndpointSpec* spec = obj->getEndpointSpec();
         if (spec == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
-        if (spec->checkLink(false) != 0) {
-            MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+        if (!freezer.visit(spec, slot))
             continue;
-        }
-        if (spec->isLinked()) {
-            ChainState chain = examineChain(spec, m_endpointSpecs.trash);
-            // An ignored spec passes checkLink whatever its chain holds; its
-            // delay is only frozen when the chain can be computed.
-            if (chain.touchesTrash && chain.computable) {
-                spec->setDelayValue(spec->getDelayValue());
-                Tsd_Period* period = spec->getPeriod();
-                if (period != nullptr && period->hasPhase())
-                    period->setPhase(Tsd_TimeValue(), true);
-            } else if (chain.touchesTrash) {
-                MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
-            }
-        }
         if (spec->getIgnoreGroup() != nullptr && isTIGGroupTrashed(spec->getIgnoreGroup()))
             spec->setIgnoreGroup(nullptr);
     }

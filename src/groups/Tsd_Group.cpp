@@ -2,6 +2,7 @@
 // groups.
 #include "tsd/Tsd_Groups.h"
 
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 
@@ -40,6 +41,12 @@ Tsd_Group::Tsd_Group(const char* name) : m_name(name) {}
 Tsd_Group::Tsd_Group(const Tsd_Group& other) : Tsd_BaseObj(other), m_name(other.m_name) {}
 
 Tsd_Group::~Tsd_Group() = default;
+
+void Tsd_Group::setName(const char* name) {
+    m_name.set(name);
+    // The design's lookups by name catch up with the change.
+    tsd_detail::noteNameChange();
+}
 
 void Tsd_Group::dump(DumpStream& stream, short indent) const {
     dumpLine(stream, indent, tsd_detail::nameLine(getName()));

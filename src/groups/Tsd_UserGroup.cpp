@@ -2,13 +2,15 @@
 // search for circular definitions.
 #include "tsd/Tsd_Groups.h"
 
+#include "internal/Tsd_GroupCircles.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_PropBuffers.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
 
+#include <algorithm>
+#include <functional>
 #include <string>
-#include <unordered_set>
 #include <vector>
 
 using tsd_detail::dumpLine;
@@ -105,6 +107,20 @@ bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
     return removed;
 }
 
+void Tsd_UserGroup::removeMembers(const std::vector<const Tsd_PredefGroup*>& members,
+                                  bool exclude) {
+    Tsd_BaseObjList& list = exclude ? m_excludes : m_includes;
+    for (int i = 0; i < list.getCount(); ++i) {
+        Tsd_GroupRef* entry = entryAt(list, i);
+        if (entry != nullptr &&
+            std::binary_search(members.begin(), members.end(), entry->getMember(),
+                               std::less<const Tsd_PredefGroup*>())) {
+            list.setAt(i, nullptr);
+            delete entry;
+        }
+    }
+}
+
 void Tsd_UserGroup::clearDef() {
     deleteEntries(m_includes);
     deleteEntries(m_excludes);
@@ -153,26 +169,26 @@ void Tsd_UserGroup::dump(DumpStream& stream, short indent) const {
 namespace {
 
 // One user group on the current route of the circular-definition walk, and
-// how far its members have been walked.
+// how far its members have been walked: included members first, then
+// excluded ones.
 struct Frame {
     Tsd_UserGroup* group;
-    Tsd_UserGroupIter includes;
-    Tsd_UserGroupIter excludes;
+    Tsd_UserGroupIter members;
     bool inExcludes;
     int countOnEntry;
 
-    explicit Frame(Tsd_UserGroup* g, int count)
-        : group(g), includes(g, false), excludes(g, true), inExcludes(false), countOnEntry(count) {}
+    Frame(Tsd_UserGroup* g, int count)
+        : group(g), members(g, false), inExcludes(false), countOnEntry(count) {}
 
-    // The next member to visit: included members first, then excluded ones.
     Tsd_PredefGroup* nextMember() {
         Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
-        if (!inExcludes) {
-            if (Tsd_PredefGroup* member = includes.next(edge))
-                return member;
+        Tsd_PredefGroup* member = members.next(edge);
+        if (member == nullptr && !inExcludes) {
             inExcludes = true;
+            members = Tsd_UserGroupIter(group, true);
+            member = members.next(edge);
         }
-        return excludes.next(edge);
+        return member;
     }
 };
 
@@ -190,41 +206,44 @@ void reportCircle(const std::vector<Frame>& route) {
 
 } // namespace
 
-int Tsd_UserGroup::checkInExcludes(bool report) {
-    // A depth-first walk over every route from this group, with an explicit
+int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchState& state) {
+    // A depth-first walk over every route from the group, with an explicit
     // stack so that a long chain of definitions cannot exhaust the call
     // stack. Each route that comes back to a group already on it is one
     // circle. A group whose walk found no circle reaches no circle at all,
-    // whatever the route to it, so later routes skip it: that keeps sound
-    // definitions with many shared members linear, and changes no count.
+    // whatever the route to it, so later routes (and later searches) skip
+    // it: that keeps sound definitions linear and changes no count.
+    if (state.isFree(start))
+        return 0;
     int count = 0;
-    std::unordered_set<const Tsd_UserGroup*> clean;
-    std::unordered_set<const Tsd_UserGroup*> onRoute;
     std::vector<Frame> route;
-    route.emplace_back(this, count);
-    onRoute.insert(this);
+    route.emplace_back(start, count);
+    state.enterRoute(start);
     while (!route.empty()) {
         Tsd_PredefGroup* member = route.back().nextMember();
         if (member == nullptr) {
-            if (count == route.back().countOnEntry)
-                clean.insert(route.back().group);
-            onRoute.erase(route.back().group);
+            state.leaveRoute(route.back().group, count == route.back().countOnEntry);
             route.pop_back();
             continue;
         }
         Tsd_UserGroup* user = member->getUserGroup();
-        if (user == nullptr || clean.count(user) != 0)
+        if (user == nullptr || state.isFree(user))
             continue;
-        if (onRoute.count(user) != 0) {
+        if (state.isOnRoute(user)) {
             ++count;
             if (report)
                 reportCircle(route);
             continue;
         }
         route.emplace_back(user, count);
-        onRoute.insert(user);
+        state.enterRoute(user);
     }
     return count;
+}
+
+int Tsd_UserGroup::checkInExcludes(bool report) {
+    tsd_detail::CircleSearchState state;
+    return tsd_detail::countCircles(this, report, state);
 }
 
 // --- Tsd_UserGroupIter -----------------------------------------------------

@@ -1,6 +1,8 @@
 // The specification base, endpoint specifications and TSid links.
 #include "tsd/Tsd_Specs.h"
 
+#include "internal/Tsd_LinkGraph.h"
+#include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
@@ -21,6 +23,12 @@ Tsd_Spec::Tsd_Spec(const Tsd_Spec& other)
     : Tsd_BaseObj(other), m_tsid(other.m_tsid), m_scope(other.m_scope) {}
 
 Tsd_Spec::~Tsd_Spec() = default;
+
+void Tsd_Spec::setTSid(const char* tsid) {
+    m_tsid.set(tsid);
+    // The design's lookups by TSid catch up with the change.
+    tsd_detail::noteNameChange();
+}
 
 // --- Tsd_EndpointSpec ------------------------------------------------------
 
@@ -111,9 +119,7 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
             if (current == this)
                 return count;
             if (report)
-                TSD_MSG().error("Specification \"%s\" is defined in terms of specification \"%s\", "
-                                "which is an ignored path.\n",
-                                getTSid(), current->getTSid());
+                tsd_detail::reportIgnoredLink(this, current);
             return count + 1;
         }
         const LinkData* link = current->m_link.get();
@@ -122,12 +128,9 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
         // The list only records addresses; nothing is changed through it.
         visited.addObj(const_cast<Tsd_EndpointSpec*>(current));
         visitedSet.insert(current);
-        if (!link->multiply && link->factor == 0.0) {
+        if (tsd_detail::dividesByZero(current)) {
             if (report)
-                TSD_MSG().error(
-                    "Delay expression for specification \"%s\" contains a division by zero: "
-                    "\"%s\"\n",
-                    current->getTSid(), formatLink(link, " "));
+                tsd_detail::reportZeroDivisor(current);
             ++count;
         }
         if (visitedSet.count(link->spec) != 0) {

@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <random>
 #include <vector>
 
 using tsd_test::NamedRef;
@@ -159,4 +161,52 @@ TEST(DArray, ResetKeepsNothingAndRemoveAtShiftsLaterSlots) {
     array.setAt(7, &a);           // out of range writes nothing
     array.reset(0);
     EXPECT_EQ(array.getCount(), 0);
+}
+
+// Large lists answer from an index; it must agree with a plain scan through
+// every way a list changes, duplicates included.
+TEST(BaseObjList, LargeListsAgreeWithAScanThroughEveryChange) {
+    std::vector<Plain> pool(60);
+    std::mt19937 rng(7);
+    auto pick = [&] { return &pool[rng() % pool.size()]; };
+    for (int round = 0; round < 40; ++round) {
+        Tsd_BaseObjList list;
+        std::vector<Tsd_BaseObj*> model;
+        for (int step = 0; step < 400; ++step) {
+            Tsd_BaseObj* p = pick();
+            const unsigned op = rng() % 100;
+            const int count = static_cast<int>(model.size());
+            if (op < 45) {
+                list.addObj(p);
+                model.push_back(p);
+            } else if (op < 75) {
+                auto it = std::find(model.begin(), model.end(), p);
+                EXPECT_EQ(list.removeObj(p), it != model.end());
+                if (it != model.end())
+                    *it = nullptr;
+            } else if (op < 88 && count > 0) {
+                // A store by hand: a hole, another object, or the same one.
+                int i = static_cast<int>(rng() % count);
+                Tsd_BaseObj* q = rng() % 3 == 0 ? nullptr : p;
+                list.setAt(i, q);
+                model[i] = q;
+            } else if (op < 92 && count > 0) {
+                int i = static_cast<int>(rng() % count);
+                list.removeAt(i);
+                model.erase(model.begin() + i);
+            } else if (op < 94) {
+                int n = count > 0 ? static_cast<int>(rng() % count) : 0;
+                list.reset(n);
+                model.resize(n);
+            }
+            ASSERT_EQ(list.getCount(), static_cast<int>(model.size()));
+            Tsd_BaseObj* probe = pick();
+            EXPECT_EQ(list.contains(probe),
+                      std::find(model.begin(), model.end(), probe) != model.end());
+            EXPECT_EQ(list.isEmpty(), std::count(model.begin(), model.end(), nullptr) ==
+                                          static_cast<std::ptrdiff_t>(model.size()));
+        }
+        for (int i = 0; i < list.getCount(); ++i)
+            ASSERT_EQ(list.getAt(i), model[i]);
+    }
 }

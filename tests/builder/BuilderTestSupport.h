@@ -21,7 +21,9 @@ public:
     using Tsd_Builder::getContext;
     using Tsd_Builder::getUnresolvedGroupList;
     using Tsd_Builder::initBaseBuilder;
+    using Tsd_Builder::resolvePendingLinks;
     using Tsd_Builder::setContext;
+    using Tsd_Builder::validateUserGroups;
     explicit OpenBuilder(bool createDesign = true) : Tsd_Builder(createDesign) {}
 };
 

@@ -1,3 +1,4 @@
+#include "../design/RandomDesigns.h"
 #include "BuilderTestSupport.h"
 
 #include <gtest/gtest.h>
@@ -238,19 +239,23 @@ TEST(BuilderBuild, TIGInstallationAndTheGlobalTIG) {
 TEST(BuilderBuild, ClockNetsWithoutTheirPropertyAreReportedWithTheirHolders) {
     MessageCapture capture;
     PropSet set;
-    set.refs = {{"f", "TS_TNM", "pads"}};
+    set.refs = {{"f", "TS_TNM", "pads"}, {"p", "TS_FEEDBACK", "1 ns NET sysclk"}};
     set.specs = {{"OFFSET", "IN 2 ns BEFORE sysclk"},
+                 {"OFFSET", "IN 3 ns BEFORE altclk"},
                  {"TS_GROUP_BASED_OFFSET", "TIMEGRP pads OFFSET = OUT 1 ns AFTER sysclk"}};
     Built built = build(set);
     EXPECT_EQ(built.design, nullptr);
-    EXPECT_EQ(built.errors, 1);
-    EXPECT_EQ(capture.sink.errors(),
-              (std::vector<std::string>{"The following spec(s) referenced the Tsd_ClkGroup "
-                                        "\"sysclk\", but no such TS_CLKGRP reference property was "
-                                        "added to the builder:\n"}));
-    EXPECT_EQ(capture.sink.statuses(),
-              (std::vector<std::string>{"   OFFSET=IN 2000 pS BEFORE sysclk\n",
-                                        "   TIMEGRP pads OFFSET=OUT 1000 pS AFTER sysclk\n"}));
+    EXPECT_EQ(built.errors, 2);
+    // Per clock group: the offsets that name it, then the port timings.
+    EXPECT_EQ(capture.sink.transcript(),
+              "error: The following spec(s) referenced the Tsd_ClkGroup \"sysclk\", but no such "
+              "TS_CLKGRP reference property was added to the builder:\n"
+              "status:    OFFSET=IN 2000 pS BEFORE sysclk\n"
+              "status:    TIMEGRP pads OFFSET=OUT 1000 pS AFTER sysclk\n"
+              "status:    FEEDBACK=1000 pS NET sysclk\n"
+              "error: The following spec(s) referenced the Tsd_ClkGroup \"altclk\", but no such "
+              "TS_CLKGRP reference property was added to the builder:\n"
+              "status:    OFFSET=IN 3000 pS BEFORE altclk\n");
 }
 
 namespace {
@@ -447,4 +452,125 @@ TEST(BuilderBuild, NamesThatNeedQuotesCanBeDefined) {
             "TIMEGRP:\na\"b'c=x::y\n        ^\n",
             "Processing TIMESPEC definition \"TS 2=BOGUS:a\": Encountered bad token \"BOGUS\" "
             "in TIMESPEC:\nTS 2=BOGUS:a\n     ^\n"}));
+}
+
+// The builder checks every user group and every spec with shared walks; the
+// messages and counts must be those of checking each one alone.
+TEST(BuilderBuild, WholeDesignChecksMatchCheckingEachGroupAndSpecAlone) {
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        Tsd_Design shared, alone;
+        tsd_test::fillGroups(seed, shared);
+        tsd_test::fillGroups(seed, alone);
+        tsd_test::fillSpecs(seed, shared);
+        tsd_test::fillSpecs(seed, alone);
+        std::string sharedText, aloneText;
+        short sharedCount = 0;
+        int aloneCount = 0;
+        {
+            MessageCapture capture;
+            OpenBuilder builder(false);
+            builder.initBaseBuilder(&shared);
+            sharedText = fatalText([&] {
+                builder.validateUserGroups();
+                builder.resolvePendingLinks();
+            });
+            sharedText += capture.sink.transcript();
+            sharedCount = builder.getNumError();
+        }
+        {
+            MessageCapture capture;
+            aloneText = fatalText([&] {
+                for (Tsd_BaseObjList* list : {alone.getGroupList(), alone.getEndpointSpecList()}) {
+                    Tsd_BaseObjListIter iter(list);
+                    while (Tsd_BaseObj* obj = iter.next()) {
+                        if (Tsd_UserGroup* group = obj->getUserGroup())
+                            aloneCount += group->checkInExcludes(true);
+                        else if (Tsd_EndpointSpec* spec = obj->getEndpointSpec())
+                            aloneCount += spec->checkLink(true);
+                    }
+                }
+            });
+            aloneText += capture.sink.transcript();
+        }
+        ASSERT_EQ(sharedText, aloneText);
+        ASSERT_EQ(sharedCount, aloneCount);
+    }
+}
+
+namespace {
+
+// Counts what a dump writes without keeping it.
+class CountingBuffer : public std::streambuf {
+public:
+    std::size_t count = 0;
+
+protected:
+    int_type overflow(int_type c) override {
+        ++count;
+        return c;
+    }
+    std::streamsize xsputn(const char*, std::streamsize n) override {
+        count += static_cast<std::size_t>(n);
+        return n;
+    }
+};
+
+struct Shape {
+    const char* name;
+    PropSet set;
+    std::size_t trashed; // objects trim() reports once `base` is withdrawn
+};
+
+} // namespace
+
+// Chains as deep as a large design can make them: a chain of definitions
+// each naming the next, a chain of linked TSids, one group of very many
+// members. Building, trimming after the base is withdrawn and dumping must
+// neither exhaust the stack nor take long (measured by the benchmarks).
+TEST(BuilderBuild, DeepChainsAndWideGroupsBuildTrimAndDump) {
+    const int n = 200000;
+    std::vector<Shape> shapes(3);
+    shapes[0] = {"group chain", {}, std::size_t(n) + 2};
+    shapes[0].set.refs = {{"base", "TS_TNM", "leaf"}};
+    for (int i = 0; i < n; ++i)
+        shapes[0].set.groups.emplace_back("g" + std::to_string(i),
+                                          i + 1 < n ? "g" + std::to_string(i + 1) : "leaf");
+    shapes[0].set.specs = {{"TS0", "PERIOD g0 10 ns"}};
+    shapes[1] = {"linked TSids", {}, 2};
+    shapes[1].set.refs = {{"base", "TS_TNM", "clk"}, {"d", "TS_TNM", "data"}};
+    for (int i = n - 1; i > 0; --i)
+        shapes[1].set.specs.emplace_back("TS" + std::to_string(i),
+                                         "PERIOD data TS" + std::to_string(i - 1) + " * 1");
+    shapes[1].set.specs.emplace_back("TS0", "PERIOD clk 10 ns");
+    shapes[2] = {"wide group", {}, std::size_t(n) + 2};
+    std::string members;
+    for (int i = 0; i < n; ++i) {
+        shapes[2].set.refs.push_back({"base", "TS_TNM", "m" + std::to_string(i)});
+        members += (i != 0 ? ":m" : "m") + std::to_string(i);
+    }
+    shapes[2].set.groups = {{"wide", members}};
+    shapes[2].set.specs = {{"TS0", "PERIOD wide 10 ns"}};
+
+    for (Shape& shape : shapes) {
+        SCOPED_TRACE(shape.name);
+        MessageCapture capture;
+        auto* design = new tsd_test::RecordingDesign;
+        OpenBuilder builder(false);
+        builder.initBaseBuilder(design);
+        Built built = build(shape.set, builder);
+        if (built.design == nullptr)
+            built.design.reset(design); // a failed build leaves it with us
+        ASSERT_EQ(built.errors, 0) << capture.sink.transcript().substr(0, 2000);
+        for (auto& ref : built.refs)
+            if (ref.first == "base")
+                ref.second->trim();
+        EXPECT_TRUE(design->trim());
+        EXPECT_EQ(design->trashed.size(), shape.trashed);
+        CountingBuffer counter;
+        std::ostream out(&counter);
+        DumpStream stream(out);
+        design->dump(stream, 0);
+        EXPECT_GT(counter.count, std::size_t(n));
+    }
 }

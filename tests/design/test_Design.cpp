@@ -2,6 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <cstring>
+#include <memory>
+#include <random>
+
 using tsd_test::attachRef;
 using tsd_test::fatalText;
 using tsd_test::MessageCapture;
@@ -200,4 +204,100 @@ TEST(Design, DumpNestsObjectsAndNamesTheReferenceType) {
                            "         trashed objects:\n";
     EXPECT_EQ(text.substr(0, expected.size()), expected);
     EXPECT_NE(text.find("      global TIG is installed\n"), std::string::npos);
+}
+
+// The finds answer from indexes; they must agree with a walk of the lists
+// through every way the lists and the names change, foreign objects included.
+TEST(Design, FindsAgreeWithAWalkThroughEveryChange) {
+    MessageCapture capture;
+    const char* const names[] = {"a", "b", "c", "d", nullptr};
+    auto name = [&](unsigned r) { return names[r % 5]; };
+    std::mt19937 rng(11);
+    for (int round = 0; round < 20; ++round) {
+        Tsd_Design design;
+        std::vector<std::unique_ptr<Tsd_BaseObj>> pool; // the test owns every object
+        std::vector<Tsd_Group*> groups;
+        std::vector<Tsd_EndpointSpec*> specs;
+        Tsd_BaseObjList* lists[] = {design.getGroupList(), design.getGroupTrash(),
+                                    design.getEndpointSpecList(), design.getEndpointSpecTrash()};
+        // The first match of a walk of active then trash; null for a fatal.
+        auto walk = [&](bool ofSpecs, const char* key, bool trash, bool& fatal) -> Tsd_BaseObj* {
+            fatal = false;
+            for (int l = 0; l < (trash ? 2 : 1); ++l) {
+                const Tsd_BaseObjList* list = lists[(ofSpecs ? 2 : 0) + l];
+                for (int i = 0; i < list->getCount(); ++i) {
+                    Tsd_BaseObj* obj = list->getAt(i);
+                    if (obj == nullptr)
+                        continue;
+                    Tsd_Group* g = ofSpecs ? nullptr : obj->getGroup();
+                    Tsd_EndpointSpec* s = ofSpecs ? obj->getEndpointSpec() : nullptr;
+                    if (g == nullptr && s == nullptr) {
+                        fatal = true;
+                        return nullptr;
+                    }
+                    const char* k = g != nullptr ? g->getName() : s->getTSid();
+                    if (k != nullptr && std::strcmp(k, key) == 0)
+                        return obj;
+                }
+            }
+            return nullptr;
+        };
+        for (int step = 0; step < 300; ++step) {
+            const unsigned op = rng() % 100;
+            Tsd_BaseObjList* list = lists[rng() % 4];
+            const bool ofSpecs = list == lists[2] || list == lists[3];
+            if (op < 35 || groups.empty()) {
+                auto* g = new Tsd_TNMGroup(name(rng()));
+                auto* s = new Tsd_DelayPath("TS");
+                s->setTSid(name(rng()));
+                pool.emplace_back(g);
+                pool.emplace_back(s);
+                groups.push_back(g);
+                specs.push_back(s);
+                design.getGroupList()->addObj(g);
+                design.getEndpointSpecList()->addObj(s);
+            } else if (op < 50) {
+                design.moveGroupToTrash(groups[rng() % groups.size()]);
+                design.moveEndpointSpecToTrash(specs[rng() % specs.size()]);
+            } else if (op < 60) {
+                list->removeObj(ofSpecs ? static_cast<Tsd_BaseObj*>(specs[rng() % specs.size()])
+                                        : groups[rng() % groups.size()]);
+            } else if (op < 70 && list->getCount() > 0) {
+                Tsd_BaseObj* obj = rng() % 2 ? nullptr
+                                   : ofSpecs
+                                       ? static_cast<Tsd_BaseObj*>(specs[rng() % specs.size()])
+                                       : groups[rng() % groups.size()];
+                list->setAt(static_cast<int>(rng() % list->getCount()), obj);
+            } else if (op < 85) {
+                groups[rng() % groups.size()]->setName(name(rng()));
+                specs[rng() % specs.size()]->setTSid(name(rng()));
+            } else if (op < 87) {
+                // An object of the wrong class in a typed list.
+                auto* foreign = new Tsd_Offset();
+                pool.emplace_back(foreign);
+                list->addObj(foreign);
+            } else if (op < 89) {
+                list->removeAt(static_cast<int>(rng() % (list->getCount() + 1)));
+            }
+            for (bool specsToo : {false, true}) {
+                for (const char* key : {"a", "b", "e"}) {
+                    const bool trash = rng() % 2 != 0;
+                    bool fatal = false;
+                    Tsd_BaseObj* expected = walk(specsToo, key, trash, fatal);
+                    Tsd_BaseObj* found = nullptr;
+                    std::string text = fatalText([&] {
+                        found = specsToo ? static_cast<Tsd_BaseObj*>(
+                                               design.findEndpointSpecByTSid(key, trash))
+                                         : design.findGroupByUserName(key, trash);
+                    });
+                    ASSERT_EQ(text != "<no fatal message>", fatal) << round << " " << step;
+                    if (!fatal) {
+                        ASSERT_EQ(found, expected) << round << " " << step << " " << key;
+                    }
+                }
+            }
+        }
+        for (Tsd_BaseObjList* l : lists)
+            l->emptyList();
+    }
 }

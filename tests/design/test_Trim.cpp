@@ -1,9 +1,18 @@
 #include "DesignTestSupport.h"
+#include "RandomDesigns.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstdint>
+#include <cstring>
+#include <random>
+#include <string>
+
 using tsd_test::attachRef;
 using tsd_test::fatalText;
+using tsd_test::fillGroups;
+using tsd_test::fillSpecs;
 using tsd_test::MessageCapture;
 using tsd_test::NamedRef;
 using tsd_test::RecordingDesign;
@@ -390,4 +399,167 @@ TEST(GroupHolders, TheListIsAppendedToAndANullListIsFatal) {
     MessageCapture capture;
     EXPECT_EQ(fatalText([&] { h.design.getGroupHolders(h.tnm, nullptr); }),
               "NULL list passed to getGroupHolders().\n");
+}
+
+// trim() computes its cascades with worklists; these tests run the passes and
+// walks as literally described on a twin of each random design and compare
+// everything that can be seen: what is reported, in order, the messages, the
+// dumps and the exact delay values.
+namespace {
+
+std::string nameOf(Tsd_BaseObj* obj) {
+    Tsd_Group* group = obj->getGroup();
+    const char* name = group != nullptr ? group->getName() : obj->getSpec()->getTSid();
+    return name != nullptr ? name : "<null>";
+}
+
+std::vector<std::string> reported(const RecordingDesign& design) {
+    std::vector<std::string> out;
+    for (const auto& entry : design.trashed)
+        out.push_back(nameOf(entry.first) + " " + std::to_string(entry.second));
+    return out;
+}
+
+// The group steps of trim as literally described: reference owners, then
+// user-group passes until one trashes nothing, then the unlinking of
+// trashed members one member at a time.
+bool literalGroupTrim(RecordingDesign& design) {
+    auto trashIf = [&](Tsd_Group* group, Reason reason) {
+        if (!design.moveGroupToTrash(group))
+            return false;
+        design.trashed.emplace_back(group, reason);
+        return true;
+    };
+    bool any = false;
+    Tsd_BaseObjListIter refs(design.getGroupList());
+    while (Tsd_BaseObj* obj = refs.next())
+        if (obj->getRefList() != nullptr && obj->getRefList()->isEmpty())
+            any |= trashIf(obj->getGroup(), Tsd_Design::TRIM_NO_REFERENCES);
+    for (bool again = true; again;) {
+        again = false;
+        Tsd_BaseObjListIter pass(design.getGroupList());
+        while (Tsd_BaseObj* obj = pass.next()) {
+            Tsd_UserGroup* user = obj->getUserGroup();
+            if (user == nullptr)
+                continue;
+            bool empty = true;
+            Tsd_UserGroupIter members(user, false);
+            Tsd_UserGroup::Edge edge;
+            while (Tsd_PredefGroup* member = members.next(edge))
+                empty = empty && design.isGroupTrashed(member);
+            if (empty && trashIf(user, Tsd_Design::TRIM_EMPTY_USER_GROUP))
+                again = any = true;
+        }
+    }
+    Tsd_BaseObjListIter survivors(design.getGroupList());
+    while (Tsd_BaseObj* obj = survivors.next()) {
+        if (Tsd_UserGroup* user = obj->getUserGroup()) {
+            for (bool exclude : {false, true}) {
+                Tsd_UserGroupIter members(user, exclude);
+                Tsd_UserGroup::Edge edge;
+                while (Tsd_PredefGroup* member = members.next(edge))
+                    if (design.isGroupTrashed(member))
+                        user->removeGroup(member, exclude);
+            }
+        }
+    }
+    return any;
+}
+
+// The unlinking of specs as literally described: the link check, then a walk
+// of the chain, spec by spec in list order.
+void literalFreeze(Tsd_Design& design) {
+    Tsd_BaseObjListIter specs(design.getEndpointSpecList());
+    while (Tsd_BaseObj* obj = specs.next()) {
+        Tsd_EndpointSpec* spec = obj->getEndpointSpec();
+        if (spec->checkLink(false) != 0) {
+            MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+            continue;
+        }
+        if (!spec->isLinked())
+            continue;
+        bool computable = false, touchesTrash = false;
+        std::vector<const Tsd_EndpointSpec*> visited{spec};
+        const Tsd_EndpointSpec* current = spec;
+        for (;;) {
+            if (!current->isLinked()) {
+                computable = current->hasDelayValue();
+                break;
+            }
+            const Tsd_EndpointSpec* next = current->getLinkedSpec();
+            if ((!current->isLinkMultiplied() && current->getLinkFactor() == 0.0) ||
+                next == nullptr || std::find(visited.begin(), visited.end(), next) != visited.end())
+                break;
+            visited.push_back(next);
+            touchesTrash = touchesTrash || design.isEndpointSpecTrashed(next);
+            current = next;
+        }
+        if (touchesTrash && computable) {
+            spec->setDelayValue(spec->getDelayValue());
+            Tsd_Period* period = spec->getPeriod();
+            if (period != nullptr && period->hasPhase())
+                period->setPhase(Tsd_TimeValue(), true);
+        } else if (touchesTrash) {
+            MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+        }
+    }
+}
+
+// Every spec's delay, bit for bit, and its link target.
+std::vector<std::string> delays(Tsd_Design& design) {
+    std::vector<std::string> out;
+    for (Tsd_BaseObjList* list : {design.getEndpointSpecList(), design.getEndpointSpecTrash()}) {
+        for (int i = 0; i < list->getCount(); ++i) {
+            Tsd_EndpointSpec* spec = list->getAt(i) ? list->getAt(i)->getEndpointSpec() : nullptr;
+            if (spec == nullptr || !spec->hasDelayValue()) {
+                out.push_back(spec && spec->getLinkedSpec() ? spec->getLinkedSpec()->getTSid()
+                                                            : "-");
+                continue;
+            }
+            Tsd_TimeValue value = spec->getDelayValue();
+            std::uint64_t bits;
+            std::memcpy(&bits, &value.value, sizeof bits);
+            out.push_back(std::to_string(bits) + " " + std::to_string(value.units));
+        }
+    }
+    return out;
+}
+
+} // namespace
+
+TEST(Trim, UserGroupCascadeMatchesRepeatedPasses) {
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        RecordingDesign fast, literal;
+        fillGroups(seed, fast);
+        fillGroups(seed, literal);
+        EXPECT_EQ(fast.trim(), literalGroupTrim(literal));
+        ASSERT_EQ(reported(fast), reported(literal));
+        ASSERT_EQ(tsd_test::dumpText(fast), tsd_test::dumpText(literal));
+    }
+}
+
+TEST(Trim, FreezingLinksMatchesWalkingEachChain) {
+    MessageManager::setDebugTrace(true);
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        RecordingDesign fast, literal;
+        fillSpecs(seed, fast);
+        fillSpecs(seed, literal);
+        std::string fastText, literalText;
+        {
+            MessageCapture capture;
+            fastText = fatalText([&] { fast.trim(); });
+            fastText += capture.sink.transcript();
+        }
+        {
+            MessageCapture capture;
+            literalText = fatalText([&] { literalFreeze(literal); });
+            literalText += capture.sink.transcript();
+        }
+        ASSERT_EQ(fastText, literalText);
+        ASSERT_EQ(delays(fast), delays(literal));
+        ASSERT_EQ(tsd_test::dumpText(fast), tsd_test::dumpText(literal));
+    }
+    MessageManager::setDebugTrace(false);
 }
