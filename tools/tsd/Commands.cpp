@@ -221,6 +221,7 @@ Tsd_Group* findAnyGroup(Tsd_Design& design, const std::string& name) {
 
 int runCheck(const std::vector<std::string>& files, const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     installFatalHandler(session, options);
     session.load(files);
     session.build();
@@ -263,6 +264,7 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
 
 int runFmt(const std::string& file, const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     if (!loadAndBuild(session, {file}, options, writeEmptyLists))
         return kExitErrors;
     std::string out = outputBuffer(session, options);
@@ -281,8 +283,9 @@ int runFmt(const std::string& file, const OutputOptions& options) {
     return session.errorCount() == 0 ? kExitOk : kExitErrors;
 }
 
-int runDump(const std::string& file) {
+int runDump(const std::string& file, const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     session.load({file});
     session.build();
     printDiagnostics(session);
@@ -295,6 +298,7 @@ int runDump(const std::string& file) {
 
 int runHolders(const std::string& file, const std::string& group, const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     auto emptyProduct = [&group](JsonWriter& json) {
         json.member("group", group).key("holders").beginArray().endArray();
     };
@@ -352,6 +356,7 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
 int runTrim(const std::string& file, const std::vector<std::string>& elements,
             const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     auto emptyProduct = [](JsonWriter& json) {
         json.key("withdrawn").beginArray().endArray();
         json.key("trashed").beginArray().endArray();
@@ -430,6 +435,7 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
 
 int runGraph(const std::string& file, const OutputOptions& options) {
     Session session;
+    session.setAssumeNetlist(options.assumeNetlist);
     OutputOptions textOnly = options;
     textOnly.json = false;
     if (!loadAndBuild(session, {file}, textOnly, JsonMembers()))

@@ -329,6 +329,10 @@ void appendDiagnostic(std::string& out, const Diagnostic& diag) {
         if (diag.line > 0) {
             out += std::to_string(diag.line);
             out += ':';
+            if (diag.column > 0) {
+                out += std::to_string(diag.column);
+                out += ':';
+            }
         }
     } else {
         out += "tsd:";

@@ -24,6 +24,7 @@ struct Diagnostic {
     Severity severity = Severity::Error;
     std::string text;                 // without the final end-of-line
     std::vector<std::string> details; // status lines that follow, each without end-of-line
+    int column = 0;                   // 0: unknown (property files: always)
 };
 
 // A library message as the sink received it, with the builder's context at

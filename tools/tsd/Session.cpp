@@ -334,6 +334,10 @@ void Session::feed(std::size_t index) {
     }
 }
 
+void Session::addDesignNet(std::string_view net) {
+    m_designNets.emplace_back(net);
+}
+
 bool Session::build() {
     m_building = true;
     Tsd_Design* result = m_builder->buildTSDesign();

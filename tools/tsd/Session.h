@@ -120,6 +120,17 @@ public:
     PropStore& store() { return m_store; }
     const PropStore& store() const { return m_store; }
 
+    // A net that the input names as a net of the design (a NET statement):
+    // an OFFSET or FEEDBACK that uses it as its clock gets its clock group
+    // from the session, as a toolchain program gets it from its netlist.
+    // Call before build().
+    void addDesignNet(std::string_view net);
+    // Group names, clock nets and TSids that the input uses but never
+    // defines are taken as defined by the netlist (a note each) instead of
+    // being errors. Call before build().
+    void setAssumeNetlist(bool assume) { m_assumeNetlist = assume; }
+    bool assumeNetlist() const { return m_assumeNetlist; }
+
     // Builds the design; true when it was built and no error was reported.
     bool build();
 
@@ -179,6 +190,8 @@ private:
     std::string m_name;
     std::string m_value;
     std::string m_lastRefProp; // the last name taken as a reference property
+    std::vector<std::string> m_designNets;
+    bool m_assumeNetlist = false;
     bool m_building = false;
     bool m_built = false;
     bool m_closing = false; // the design is being destroyed with the session

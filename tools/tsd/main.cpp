@@ -67,6 +67,19 @@ int main(int argc, char** argv) {
     graph->add_option("file", file, kFileHelp)->required();
     graph->add_option("-o,--output", options.outFile, "write to this file instead of stdout");
 
+    for (CLI::App* sub : {check, fmt, dump, holders, trim, graph}) {
+        sub->add_flag("--assume-netlist", options.assumeNetlist,
+                      "take group names, clock nets and TSids that the files use but never "
+                      "define as defined by the netlist (a note each)");
+        sub->add_option("--format", options.format,
+                        "read the files as property files or statement files (default: "
+                        "told by their content)")
+            ->check(CLI::IsMember({"props", "statements"}));
+    }
+    fmt->add_option("--to", options.to,
+                    "write property lines or statements (default: the form read)")
+        ->check(CLI::IsMember({"props", "statements"}));
+
     // A first word that is neither an option nor a command is a typo.
     if (argc > 1 && argv[1][0] != '-') {
         bool known = false;
@@ -95,7 +108,7 @@ int main(int argc, char** argv) {
         if (fmt->parsed())
             return tsd_cli::runFmt(file, options);
         if (dump->parsed())
-            return tsd_cli::runDump(file);
+            return tsd_cli::runDump(file, options);
         if (holders->parsed())
             return tsd_cli::runHolders(file, group, options);
         if (trim->parsed())
