@@ -109,12 +109,12 @@ void checkConversions(const StatementFile& file) {
         const PropRecord& prop = record.prop;
         if (hasControl(prop.element) || hasControl(prop.name) || hasControl(prop.value))
             continue;
-        PropLine parsed;
+        PropFields parsed;
         std::string error;
         require(parsePropLine(line, parsed, error) == LineStatus::Property);
         bool name = record.form == ValueForm::Name;
-        require(parsed.kind == prop.kind && parsed.element == prop.element &&
-                parsed.name == prop.name &&
+        require(parsed.kind == prop.kind && parsed.element.str() == prop.element &&
+                parsed.name.str() == prop.name &&
                 (name ? refValueName(parsed.value) : parsed.value) == prop.value);
         std::string statement;
         if (propToStatement(prop, statement, error))

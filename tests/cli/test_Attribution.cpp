@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -13,22 +14,27 @@ using tsd_cli::attributeBuildMessages;
 using tsd_cli::Diagnostic;
 using tsd_cli::processingContext;
 using tsd_cli::PropKind;
-using tsd_cli::PropLine;
+using tsd_cli::PropStore;
 using tsd_cli::RawMessage;
 using tsd_cli::Severity;
 
 namespace {
 
-PropLine prop(PropKind kind, int line, const char* name, const char* value,
-              const char* element = "") {
-    PropLine p;
-    p.kind = kind;
-    p.file = "f.props";
-    p.line = line;
-    p.element = element;
-    p.name = name;
-    p.value = value;
-    return p;
+struct Prop {
+    PropKind kind;
+    std::uint32_t line;
+    const char* name;
+    const char* value;
+    const char* element = "";
+};
+
+// The records of "f.props".
+PropStore store(const std::vector<Prop>& props) {
+    PropStore store;
+    store.addFile("f.props", "");
+    for (const Prop& p : props)
+        store.add(p.kind, 0, p.line, p.element, p.name, p.value);
+    return store;
 }
 
 RawMessage error(const std::string& text, const std::string& context = "") {
@@ -55,16 +61,16 @@ using Lines = std::vector<std::string>;
 } // namespace
 
 TEST(Attribution, ContextsOfStoredLines) {
-    std::vector<PropLine> props = {
-        prop(PropKind::Ref, 1, "TS_TNM", "a", "e1"),
-        prop(PropKind::Group, 2, "g", "a"),
-        prop(PropKind::Spec, 3, "TS01", "FROM a TO nope 1 ns"),
-        prop(PropKind::Spec, 4, "TS02", "FROM x TO y 1 ns"),
-    };
-    std::string spec1 = processingContext(props[2]);
-    std::string spec2 = processingContext(props[3]);
+    PropStore props = store({
+        {PropKind::Ref, 1, "TS_TNM", "a", "e1"},
+        {PropKind::Group, 2, "g", "a"},
+        {PropKind::Spec, 3, "TS01", "FROM a TO nope 1 ns"},
+        {PropKind::Spec, 4, "TS02", "FROM x TO y 1 ns"},
+    });
+    std::string spec1 = processingContext(props, props[2]);
+    std::string spec2 = processingContext(props, props[3]);
     EXPECT_EQ(spec1, "Processing TIMESPEC definition \"TS01=FROM a TO nope 1 ns\": ");
-    EXPECT_EQ(processingContext(props[1]), "Processing TIMEGRP definition \"g=a\": ");
+    EXPECT_EQ(processingContext(props, props[1]), "Processing TIMEGRP definition \"g=a\": ");
 
     auto diags =
         attributeBuildMessages(props,
@@ -78,13 +84,13 @@ TEST(Attribution, ContextsOfStoredLines) {
 }
 
 TEST(Attribution, IdenticalLinesEachGetTheirMessages) {
-    std::vector<PropLine> props = {
-        prop(PropKind::Spec, 1, "TS01", "FROM a TO b 1 qq"),
-        prop(PropKind::Spec, 2, "TS02", "FROM c TO d 1 ns"),
-        prop(PropKind::Spec, 3, "TS01", "FROM a TO b 1 qq"),
-        prop(PropKind::Spec, 4, "TS01", "FROM a TO b 1 qq"),
-    };
-    std::string ctx = processingContext(props[0]);
+    PropStore props = store({
+        {PropKind::Spec, 1, "TS01", "FROM a TO b 1 qq"},
+        {PropKind::Spec, 2, "TS02", "FROM c TO d 1 ns"},
+        {PropKind::Spec, 3, "TS01", "FROM a TO b 1 qq"},
+        {PropKind::Spec, 4, "TS01", "FROM a TO b 1 qq"},
+    });
+    std::string ctx = processingContext(props, props[0]);
     // Line 1 reports twice with different texts, line 3 the same two, line 4
     // only the first: a repeated text moves on to the next identical line.
     auto diags =
@@ -96,15 +102,16 @@ TEST(Attribution, IdenticalLinesEachGetTheirMessages) {
 }
 
 TEST(Attribution, ContextlessMessagesGoToTheLineTheyQuote) {
-    std::vector<PropLine> props = {
-        prop(PropKind::Ref, 1, "ts_tig", "TS88", "r1"),
-        prop(PropKind::Ref, 2, "TS_OFFSET", "IN 2 ns BEFORE clk TIMEGRP regs", "n1"),
-        prop(PropKind::Group, 3, "top", "\"a b\":other"),
-        prop(PropKind::Group, 4, "loop", "loop2"),
-        prop(PropKind::Spec, 5, "OFFSET", "IN 1 ns BEFORE other_clk"),
-        prop(PropKind::Spec, 6, "TS05", "FROM a TO b TS77 / 2"),
-        prop(PropKind::Ref, 7, "TS_FEEDBACK", "1 ns NET fb", "n2"),
-    };
+    PropStore props = store({
+        {PropKind::Ref, 1, "ts_tig", "TS88", "r1"},
+        {PropKind::Ref, 2, "TS_OFFSET", "IN 2 ns BEFORE clk TIMEGRP regs", "n1"},
+        {PropKind::Group, 3, "top", "\"a b\":other"},
+        {PropKind::Group, 4, "loop", "loop2"},
+        {PropKind::Spec, 5, "OFFSET", "IN 1 ns BEFORE other_clk"},
+        {PropKind::Spec, 6, "TS05", "FROM a TO b TS77 / 2"},
+        {PropKind::Ref, 7, "TS_FEEDBACK", "1 ns NET fb", "n2"},
+        {PropKind::Group, 8, "odd", "'q\" was referenced in one or more TIMEGRP definitions'"},
+    });
     auto diags = attributeBuildMessages(
         props,
         {
@@ -131,19 +138,22 @@ TEST(Attribution, ContextlessMessagesGoToTheLineTheyQuote) {
                   "is an ignored path."),
             error("One or more TIG directives were specified for a specification with TSid "
                   "\"TS88\", which does not exist."),
+            // The name is the longest that fits, even with the rest of the text in it.
+            error("A group named \"q\" was referenced in one or more TIMEGRP definitions\" was "
+                  "referenced in one or more TIMEGRP definitions, but was never defined."),
         },
         "f.props");
     std::vector<int> got;
     for (const Diagnostic& d : diags)
         got.push_back(d.line);
-    EXPECT_EQ(got, (std::vector<int>{3, 4, 2, 5, 7, 6, 6, 6, 6, 1}));
+    EXPECT_EQ(got, (std::vector<int>{3, 4, 2, 5, 7, 6, 6, 6, 6, 1, 8}));
     EXPECT_EQ(diags[1].details, (std::vector<std::string>{"   loop=loop2", "   loop2=loop"}));
     EXPECT_EQ(diags[3].details,
               (std::vector<std::string>{"   OFFSET=IN 1000 pS BEFORE other_clk"}));
 }
 
 TEST(Attribution, WhatCannotBeTiedToALineNamesTheFile) {
-    std::vector<PropLine> props = {prop(PropKind::Group, 1, "g", "a")};
+    PropStore props = store({{PropKind::Group, 1, "g", "a"}});
     auto diags = attributeBuildMessages(
         props,
         {error("A group named \"zz\" was referenced in one or more TIMEGRP definitions, but was "

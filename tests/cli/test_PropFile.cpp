@@ -11,22 +11,31 @@
 using tsd_cli::formatPropLine;
 using tsd_cli::LineStatus;
 using tsd_cli::parsePropLine;
+using tsd_cli::PropFields;
 using tsd_cli::PropKind;
-using tsd_cli::PropLine;
 using tsd_cli::quoteWord;
 using tsd_cli::valueWords;
 
 namespace {
 
+// A parsed line with its names unescaped.
 struct Parsed {
     LineStatus status;
-    PropLine prop;
+    PropKind kind = PropKind::Group;
+    std::string element;
+    std::string name;
+    std::string value;
     std::string error;
 };
 
 Parsed parse(const std::string& text) {
     Parsed parsed;
-    parsed.status = parsePropLine(text, parsed.prop, parsed.error);
+    PropFields prop;
+    parsed.status = parsePropLine(text, prop, parsed.error);
+    parsed.kind = prop.kind;
+    parsed.element = prop.element.str();
+    parsed.name = prop.name.str();
+    parsed.value = std::string(prop.value);
     return parsed;
 }
 
@@ -64,10 +73,10 @@ TEST(PropFile, PropertyLines) {
     for (const Case& c : cases) {
         Parsed parsed = parse(c.text);
         ASSERT_EQ(parsed.status, LineStatus::Property) << c.text << ": " << parsed.error;
-        EXPECT_EQ(parsed.prop.kind, c.kind) << c.text;
-        EXPECT_EQ(parsed.prop.element, c.element) << c.text;
-        EXPECT_EQ(parsed.prop.name, c.name) << c.text;
-        EXPECT_EQ(parsed.prop.value, c.value) << c.text;
+        EXPECT_EQ(parsed.kind, c.kind) << c.text;
+        EXPECT_EQ(parsed.element, c.element) << c.text;
+        EXPECT_EQ(parsed.name, c.name) << c.text;
+        EXPECT_EQ(parsed.value, c.value) << c.text;
     }
 }
 
@@ -98,6 +107,7 @@ TEST(PropFile, MalformedLinesSayWhatIsWrong) {
         {"group a = b\x01", "control character 0x01 in column 12"},
         {"group a\x7f = b", "control character 0x7F in column 8"},
         {"group a = b\rc", "control character 0x0D in column 12"},
+        {"group\tabcdefghij = b\x02 and more", "control character 0x02 in column 21"},
     };
     for (const Case& c : cases) {
         Parsed parsed = parse(c.text);
@@ -108,11 +118,9 @@ TEST(PropFile, MalformedLinesSayWhatIsWrong) {
 }
 
 TEST(PropFile, NulInsideTheLineIsRefused) {
-    std::string text("group a = b\0c", 13);
-    PropLine prop;
-    std::string error;
-    EXPECT_EQ(parsePropLine(text, prop, error), LineStatus::Malformed);
-    EXPECT_EQ(error, "control character 0x00 in column 12");
+    Parsed parsed = parse(std::string("group a = b\0c", 13));
+    EXPECT_EQ(parsed.status, LineStatus::Malformed);
+    EXPECT_EQ(parsed.error, "control character 0x00 in column 12");
 }
 
 TEST(PropFile, QuoteOnlyWhatNeedsIt) {
@@ -138,15 +146,13 @@ TEST(PropFile, EveryWrittenLineReadsBackAsItself) {
             std::string line = formatPropLine(kind, word, word, "v = w");
             Parsed parsed = parse(line);
             ASSERT_EQ(parsed.status, LineStatus::Property) << line << ": " << parsed.error;
-            EXPECT_EQ(parsed.prop.kind, kind) << line;
-            EXPECT_EQ(parsed.prop.name, word) << line;
+            EXPECT_EQ(parsed.kind, kind) << line;
+            EXPECT_EQ(parsed.name, word) << line;
             if (kind == PropKind::Ref) {
-                EXPECT_EQ(parsed.prop.element, word) << line;
+                EXPECT_EQ(parsed.element, word) << line;
             }
-            EXPECT_EQ(parsed.prop.value, "v = w") << line;
-            EXPECT_EQ(
-                formatPropLine(kind, parsed.prop.element, parsed.prop.name, parsed.prop.value),
-                line);
+            EXPECT_EQ(parsed.value, "v = w") << line;
+            EXPECT_EQ(formatPropLine(kind, parsed.element, parsed.name, parsed.value), line);
         }
     }
     EXPECT_EQ(formatPropLine(PropKind::Group, "", "g", ""), "group g =");

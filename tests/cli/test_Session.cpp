@@ -44,28 +44,31 @@ const char* kSmallDesign = "ref ff1 TS_TNM = regs\n"
 
 TEST(Session, BuildsAndKeepsOneRecordPerRefLine) {
     Session session;
-    session.load({text("a.props", kSmallDesign)});
+    session.load({text("a.props", std::string(kSmallDesign) + "ref ff1 TS_TNM = more\n")});
     ASSERT_TRUE(session.build()) << testing::PrintToString(where(session));
-    EXPECT_EQ(session.countOf(tsd_cli::PropKind::Ref), 4);
-    ASSERT_EQ(session.refs().size(), 4u);
-    for (const tsd_cli::RefRecord& record : session.refs())
-        EXPECT_NE(record.ref, nullptr);
-    EXPECT_EQ(session.refs()[1].ref->element(), "ff2");
-    // Two records of one TNM group stand for different elements.
-    EXPECT_FALSE(session.refs()[0].ref->isEqual(session.refs()[1].ref));
-    tsd_cli::CliRef same("ff1");
-    EXPECT_TRUE(session.refs()[0].ref->isEqual(&same));
+    EXPECT_EQ(session.countOf(tsd_cli::PropKind::Ref), 5);
+    ASSERT_EQ(session.store().size(), 8u);
+    for (std::size_t i : {0, 1, 2, 3, 7})
+        EXPECT_NE(session.refOf(i), nullptr) << i;
+    EXPECT_EQ(session.refOf(4), nullptr);
+    EXPECT_EQ(session.refOf(1)->element(), "ff2");
+    // Two records of one TNM group stand for different elements; records of
+    // one element in different groups for the same.
+    EXPECT_FALSE(session.refOf(0)->isEqual(session.refOf(1)));
+    EXPECT_TRUE(session.refOf(0)->isEqual(session.refOf(7)));
+    // An object walks to its records in input order.
+    Tsd_Group* regs = session.design().findGroupByUserName("regs", false);
+    EXPECT_EQ(session.recordsOwnedBy(regs), (std::vector<std::size_t>{0, 1}));
 }
 
 TEST(Session, WithdrawTakesEveryRecordOfTheElementOnce) {
     Session session;
     session.load({text("a.props", std::string(kSmallDesign) + "ref ff1 TS_TNM = more\n")});
     ASSERT_TRUE(session.build());
-    EXPECT_EQ(session.withdraw("ff1"), 2);
-    EXPECT_EQ(session.withdraw("ff1"), 0);
-    EXPECT_EQ(session.withdraw("nothing"), 0);
-    EXPECT_EQ(session.refs()[0].ref, nullptr);
-    EXPECT_NE(session.refs()[1].ref, nullptr);
+    EXPECT_EQ(session.withdraw({"ff1", "nothing", "ff1"}), (std::vector<int>{2, 0, 0}));
+    EXPECT_EQ(session.withdraw({"ff1"}), std::vector<int>{0});
+    EXPECT_EQ(session.refOf(0), nullptr);
+    EXPECT_NE(session.refOf(1), nullptr);
 
     std::vector<std::string> trashed;
     session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason) {
@@ -110,9 +113,9 @@ TEST(Session, MessagesGoToTheirLinesInFileOrder) {
     EXPECT_EQ(session.displayFile(), "");
     EXPECT_EQ(session.fileNames(), (Lines{"a.props", "b.props"}));
     // The refused records were never owned; the session freed them.
-    EXPECT_EQ(session.refs().size(), 3u);
-    EXPECT_EQ(session.refs()[0].ref, nullptr);
-    EXPECT_NE(session.refs()[1].ref, nullptr);
+    EXPECT_EQ(session.store().size(), 8u);
+    EXPECT_EQ(session.refOf(3), nullptr);
+    EXPECT_NE(session.refOf(4), nullptr);
 }
 
 TEST(Session, AFailedBuildLeavesTheDesignToTheSession) {
@@ -122,8 +125,7 @@ TEST(Session, AFailedBuildLeavesTheDesignToTheSession) {
     EXPECT_FALSE(session.built());
     // The design and its records are still there to look at.
     EXPECT_NE(session.design().findGroupByUserName("regs", false), nullptr);
-    EXPECT_EQ(session.refs()[0].ref->getOwner(),
-              session.design().findGroupByUserName("regs", false));
+    EXPECT_EQ(session.refOf(0)->getOwner(), session.design().findGroupByUserName("regs", false));
 }
 
 TEST(Session, UnreadableInputsAreIoErrors) {
@@ -131,7 +133,7 @@ TEST(Session, UnreadableInputsAreIoErrors) {
     EXPECT_THROW(tsd_cli::readInput("/"), tsd_cli::IoError);
     Session session;
     EXPECT_THROW(session.load(std::vector<std::string>{"/nonexistent/x.props"}), tsd_cli::IoError);
-    EXPECT_TRUE(session.props().empty());
+    EXPECT_EQ(session.store().size(), 0u);
 }
 
 using SessionDeathTest = testing::Test;

@@ -332,13 +332,14 @@ TEST(Statements, ConversionsRoundTrip) {
     std::string statements;
     std::string props;
     while (std::getline(lines, line)) {
-        PropLine parsed;
+        PropFields parsed;
         std::string error;
         if (parsePropLine(line, parsed, error) != LineStatus::Property)
             continue;
         std::string statement;
-        ASSERT_TRUE(propToStatement({parsed.kind, parsed.element, parsed.name, parsed.value},
-                                    statement, error))
+        ASSERT_TRUE(propToStatement(
+            {parsed.kind, parsed.element.str(), parsed.name.str(), std::string(parsed.value)},
+            statement, error))
             << line << ": " << error;
         statements += statement + "\n";
         props += line + "\n";
@@ -351,12 +352,13 @@ TEST(Statements, ConversionsRoundTrip) {
     std::istringstream propLines(statementsToProps(file));
     std::string back;
     while (std::getline(propLines, line)) {
-        PropLine parsed;
+        PropFields parsed;
         std::string error;
         ASSERT_EQ(parsePropLine(line, parsed, error), LineStatus::Property) << line;
         std::string statement;
-        ASSERT_TRUE(propToStatement({parsed.kind, parsed.element, parsed.name, parsed.value},
-                                    statement, error))
+        ASSERT_TRUE(propToStatement(
+            {parsed.kind, parsed.element.str(), parsed.name.str(), std::string(parsed.value)},
+            statement, error))
             << line << ": " << error;
         back += statement + "\n";
     }

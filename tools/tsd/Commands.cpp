@@ -2,76 +2,65 @@
 
 #include "Describe.h"
 #include "Graph.h"
+#include "Json.h"
+#include "Pages.h"
 #include "Session.h"
 
 #include "tsd/host/DumpStream.h"
-
-#include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <fstream>
+#include <functional>
 #include <iostream>
 #include <sstream>
+#include <unordered_set>
 
 namespace tsd_cli {
 
 namespace {
 
-// Keys keep the order they are written in.
-using json = nlohmann::ordered_json;
-
-// A property as the design writes it back.
-struct OutProp {
-    PropKind kind = PropKind::Group;
-    std::string element;
-    std::string name;
-    std::string value;
-};
+constexpr const char* kListKeys[] = {"groups", "specs", "refs"};
 
 std::string plural(int n, const char* one, const char* many) {
     return std::to_string(n) + " " + (n == 1 ? one : many);
 }
 
-json nullableString(const std::string& text) {
-    return text.empty() ? json(nullptr) : json(text);
-}
-
-json diagnosticsJson(const Session& session) {
-    json list = json::array();
+void writeDiagnostics(JsonWriter& json, const Session& session) {
+    json.key("diagnostics").beginArray();
     for (const Diagnostic& diag : session.diagnostics()) {
-        list.push_back({{"file", nullableString(diag.file)},
-                        {"line", diag.line > 0 ? json(diag.line) : json(nullptr)},
-                        {"severity", severityName(diag.severity)},
-                        {"text", diag.text},
-                        {"details", diag.details}});
+        json.beginObject().key("file");
+        if (diag.file.empty())
+            json.null();
+        else
+            json.string(diag.file);
+        json.key("line");
+        if (diag.line > 0)
+            json.number(diag.line);
+        else
+            json.null();
+        json.member("severity", severityName(diag.severity))
+            .member("text", diag.text)
+            .key("details")
+            .strings(diag.details)
+            .endObject();
     }
-    return list;
+    json.endArray();
 }
 
-json propJson(const OutProp& prop) {
-    json out = {{"kind", propKeyword(prop.kind)}};
-    if (prop.kind == PropKind::Ref)
-        out["element"] = prop.element;
-    out["name"] = prop.name;
-    out["value"] = prop.value;
-    return out;
-}
-
-std::string propText(const OutProp& prop) {
-    return formatPropLine(prop.kind, prop.element, prop.name, prop.value);
-}
-
-// Invalid UTF-8 in a name must not stop the output: it is replaced.
-std::string dumpJson(const json& doc) {
-    return doc.dump(2, ' ', false, json::error_handler_t::replace) + "\n";
+void writeProp(JsonWriter& json, PropKind kind, std::string_view element, std::string_view name,
+               std::string_view value) {
+    json.beginObject().member("kind", propKeyword(kind));
+    if (kind == PropKind::Ref)
+        json.member("element", element);
+    json.member("name", name).member("value", value).endObject();
 }
 
 // Writes the product of a command to standard output or to the -o file.
 void emit(const OutputOptions& options, const std::string& text) {
     if (options.outFile.empty() || options.outFile == "-") {
-        std::cout << text;
+        std::cout.write(text.data(), static_cast<std::streamsize>(text.size()));
         std::cout.flush();
         if (!std::cout)
             throw IoError("cannot write to standard output");
@@ -80,49 +69,85 @@ void emit(const OutputOptions& options, const std::string& text) {
     std::ofstream out(options.outFile, std::ios::binary | std::ios::trunc);
     if (!out)
         throw IoError("cannot write \"" + options.outFile + "\": " + std::strerror(errno));
-    out << text;
+    out.write(text.data(), static_cast<std::streamsize>(text.size()));
     out.close();
     if (!out)
         throw IoError("cannot write \"" + options.outFile + "\": " + std::strerror(errno));
 }
 
 void printDiagnostics(const Session& session) {
+    std::string text;
     for (const Diagnostic& diag : session.diagnostics())
-        printDiagnostic(std::cerr, diag);
+        appendDiagnostic(text, diag);
+    std::cerr << text;
     std::cerr.flush();
 }
 
-// The groups, then the specifications, then each reference line in input
-// order whose record an active object still owns.
-std::vector<OutProp> canonicalProps(Session& session) {
-    std::vector<OutProp> props;
+// Room for the product of a command that writes the design back: pages
+// that stay unused cost nothing, and the text is not copied as it grows.
+// JSON takes about four times the room of property lines.
+std::string outputBuffer(const Session& session, const OutputOptions& options) {
+    std::size_t input = 0;
+    for (std::uint32_t file = 0; file < session.store().fileCount(); ++file)
+        input += session.store().fileText(file).size();
+    std::string out;
+    reserveLarge(out, (input + input / 2) * (options.json ? 4 : 1) + 4096);
+    return out;
+}
+
+std::string_view orEmpty(const char* text) {
+    return text != nullptr ? std::string_view(text) : std::string_view();
+}
+
+// Hands `visit` the canonical properties, as the design writes them back:
+// the groups, then the specifications, then each reference record in input
+// order that an active object still owns. The texts are valid during the
+// call only.
+template <class Visit>
+void forEachCanonicalProp(Session& session, Visit visit) {
     Tsd_Annotator annotator(&session.design());
     const char* name = nullptr;
     const char* value = nullptr;
-    auto text = [](const char* s) { return std::string(s != nullptr ? s : ""); };
     while (annotator.getNextGroupProp(name, value))
-        props.push_back({PropKind::Group, "", text(name), text(value)});
+        visit(PropKind::Group, std::string_view(), orEmpty(name), orEmpty(value));
     while (annotator.getNextSpecProp(name, value))
-        props.push_back({PropKind::Spec, "", text(name), text(value)});
-    for (const RefRecord& record : session.refs()) {
-        if (record.ref != nullptr && annotator.getRefProp(record.ref, name, value))
-            props.push_back({PropKind::Ref, record.ref->element(), text(name), text(value)});
+        visit(PropKind::Spec, std::string_view(), orEmpty(name), orEmpty(value));
+    for (std::size_t i = 0; i < session.store().size(); ++i) {
+        CliRef* ref = session.refOf(i);
+        if (ref != nullptr && annotator.getRefProp(ref, name, value))
+            visit(PropKind::Ref, ref->element(), orEmpty(name), orEmpty(value));
     }
-    return props;
 }
 
-json propsJson(const std::vector<OutProp>& props) {
-    json list = json::array();
-    for (const OutProp& prop : props)
-        list.push_back(propJson(prop));
-    return list;
+void appendCanonicalText(std::string& out, Session& session) {
+    forEachCanonicalProp(session, [&out](PropKind kind, std::string_view element,
+                                         std::string_view name, std::string_view value) {
+        appendPropLine(out, kind, element, name, value);
+    });
 }
 
-std::string propsText(const std::vector<OutProp>& props) {
-    std::string text;
-    for (const OutProp& prop : props)
-        text += propText(prop) + "\n";
-    return text;
+// The canonical properties as three JSON lists, by kind.
+void writeCanonicalLists(JsonWriter& json, Session& session) {
+    int open = -1; // the list being written
+    auto openUpTo = [&](int kind) {
+        for (; open < kind; ++open) {
+            if (open >= 0)
+                json.endArray();
+            json.key(kListKeys[open + 1]).beginArray();
+        }
+    };
+    forEachCanonicalProp(session, [&](PropKind kind, std::string_view element,
+                                      std::string_view name, std::string_view value) {
+        openUpTo(static_cast<int>(kind));
+        writeProp(json, kind, element, name, value);
+    });
+    openUpTo(static_cast<int>(PropKind::Ref));
+    json.endArray();
+}
+
+void writeEmptyLists(JsonWriter& json) {
+    for (const char* key : kListKeys)
+        json.key(key).beginArray().endArray();
 }
 
 // In JSON mode a fatal message still leaves a JSON document behind.
@@ -130,23 +155,35 @@ void installFatalHandler(Session& session, const OutputOptions& options) {
     if (!options.json)
         return;
     session.setFatalHandler([&session] {
-        json doc = {{"diagnostics", diagnosticsJson(session)}, {"fatal", true}};
-        std::cout << dumpJson(doc);
+        std::string out;
+        JsonWriter json(out);
+        json.beginObject();
+        writeDiagnostics(json, session);
+        json.key("fatal").boolean(true).endObject().finish();
+        std::cout << out;
     });
 }
 
-// Loads and builds one file. On errors reports them (as JSON with `empty`
-// for the product) and returns false.
+using JsonMembers = std::function<void(JsonWriter&)>;
+
+// Loads and builds one file. On errors reports them (as JSON: the members
+// `product` writes for an empty product, then the diagnostics) and returns
+// false.
 bool loadAndBuild(Session& session, const std::vector<std::string>& files,
-                  const OutputOptions& options, json empty) {
+                  const OutputOptions& options, const JsonMembers& product) {
     installFatalHandler(session, options);
     session.load(files);
     session.build();
     if (session.errorCount() == 0)
         return true;
     if (options.json) {
-        empty["diagnostics"] = diagnosticsJson(session);
-        std::cout << dumpJson(empty);
+        std::string out;
+        JsonWriter json(out);
+        json.beginObject();
+        product(json);
+        writeDiagnostics(json, session);
+        json.endObject().finish();
+        std::cout << out;
     } else {
         printDiagnostics(session);
     }
@@ -154,22 +191,20 @@ bool loadAndBuild(Session& session, const std::vector<std::string>& files,
 }
 
 // The holders of a group as property lines: an object that exists through
-// reference records stands as each of its `ref` lines.
-std::vector<OutProp> holderProps(Session& session, Tsd_BaseObjList& holders) {
-    std::vector<OutProp> props;
+// reference records stands as each of its `ref` records, in input order.
+template <class Visit>
+void forEachHolderProp(Session& session, Tsd_BaseObjList& holders, Visit visit) {
     Tsd_BaseObjListIter iter(&holders);
     while (Tsd_BaseObj* obj = iter.next()) {
         ObjectProp prop = objectProp(obj);
         if (obj->getRefList() != nullptr) {
-            for (const RefRecord& record : session.refs())
-                if (record.ref != nullptr && record.ref->getOwner() == obj)
-                    props.push_back({PropKind::Ref, record.ref->element(), prop.name, prop.value});
+            for (std::size_t record : session.recordsOwnedBy(obj))
+                visit(PropKind::Ref, session.refOf(record)->element(), prop.name, prop.value);
             continue;
         }
         PropKind kind = obj->getGroup() != nullptr ? PropKind::Group : PropKind::Spec;
-        props.push_back({kind, "", prop.name, prop.value});
+        visit(kind, std::string_view(), prop.name, prop.value);
     }
-    return props;
 }
 
 Tsd_Group* findAnyGroup(Tsd_Design& design, const std::string& name) {
@@ -196,15 +231,21 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
     int specs = session.countOf(PropKind::Spec);
     int refs = session.countOf(PropKind::Ref);
     if (options.json) {
-        json doc = {{"files", session.fileNames()},
-                    {"diagnostics", diagnosticsJson(session)},
-                    {"summary",
-                     {{"errors", errors},
-                      {"warnings", warnings},
-                      {"groups", groups},
-                      {"specs", specs},
-                      {"references", refs}}}};
-        emit(options, dumpJson(doc));
+        std::string out;
+        JsonWriter json(out);
+        json.beginObject().key("files").strings(session.fileNames());
+        writeDiagnostics(json, session);
+        json.key("summary")
+            .beginObject()
+            .member("errors", errors)
+            .member("warnings", warnings)
+            .member("groups", groups)
+            .member("specs", specs)
+            .member("references", refs)
+            .endObject()
+            .endObject()
+            .finish();
+        emit(options, out);
     } else {
         printDiagnostics(session);
         std::string what =
@@ -220,43 +261,21 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
     return errors == 0 ? kExitOk : kExitErrors;
 }
 
-namespace {
-
-// The canonical properties as three JSON lists, by kind.
-struct PropLists {
-    json groups = json::array();
-    json specs = json::array();
-    json refs = json::array();
-};
-
-PropLists propLists(const std::vector<OutProp>& props) {
-    PropLists lists;
-    for (const OutProp& prop : props) {
-        json& list = prop.kind == PropKind::Group  ? lists.groups
-                     : prop.kind == PropKind::Spec ? lists.specs
-                                                   : lists.refs;
-        list.push_back(propJson(prop));
-    }
-    return lists;
-}
-
-} // namespace
-
 int runFmt(const std::string& file, const OutputOptions& options) {
     Session session;
-    if (!loadAndBuild(
-            session, {file}, options,
-            {{"groups", json::array()}, {"specs", json::array()}, {"refs", json::array()}}))
+    if (!loadAndBuild(session, {file}, options, writeEmptyLists))
         return kExitErrors;
-    std::vector<OutProp> props = canonicalProps(session);
+    std::string out = outputBuffer(session, options);
     if (options.json) {
-        PropLists lists = propLists(props);
-        emit(options, dumpJson({{"groups", lists.groups},
-                                {"specs", lists.specs},
-                                {"refs", lists.refs},
-                                {"diagnostics", diagnosticsJson(session)}}));
+        JsonWriter json(out);
+        json.beginObject();
+        writeCanonicalLists(json, session);
+        writeDiagnostics(json, session);
+        json.endObject().finish();
+        emit(options, out);
     } else {
-        emit(options, propsText(props));
+        appendCanonicalText(out, session);
+        emit(options, out);
         printDiagnostics(session); // whatever the write-back reported
     }
     return session.errorCount() == 0 ? kExitOk : kExitErrors;
@@ -276,7 +295,10 @@ int runDump(const std::string& file) {
 
 int runHolders(const std::string& file, const std::string& group, const OutputOptions& options) {
     Session session;
-    if (!loadAndBuild(session, {file}, options, {{"group", group}, {"holders", json::array()}}))
+    auto emptyProduct = [&group](JsonWriter& json) {
+        json.member("group", group).key("holders").beginArray().endArray();
+    };
+    if (!loadAndBuild(session, {file}, options, emptyProduct))
         return kExitErrors;
     Tsd_Group* found = findAnyGroup(session.design(), group);
     if (found == nullptr) {
@@ -285,24 +307,43 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
                                Severity::Error,
                                "no group, clock group or TIG directive named " + inQuotes(group),
                                {}});
-        if (options.json)
-            emit(options, dumpJson({{"group", group},
-                                    {"holders", json::array()},
-                                    {"diagnostics", diagnosticsJson(session)}}));
-        else
+        if (options.json) {
+            std::string out;
+            JsonWriter json(out);
+            json.beginObject();
+            emptyProduct(json);
+            writeDiagnostics(json, session);
+            json.endObject().finish();
+            emit(options, out);
+        } else {
             printDiagnostics(session);
+        }
         return kExitErrors;
     }
     Tsd_BaseObjList holders;
     session.design().getGroupHolders(found, &holders);
-    std::vector<OutProp> props = holderProps(session, holders);
+    std::string out;
     if (options.json) {
-        emit(options, dumpJson({{"group", group},
-                                {"class", objectClass(found)},
-                                {"holders", propsJson(props)},
-                                {"diagnostics", diagnosticsJson(session)}}));
+        JsonWriter json(out);
+        json.beginObject()
+            .member("group", group)
+            .member("class", objectClass(found))
+            .key("holders")
+            .beginArray();
+        forEachHolderProp(
+            session, holders,
+            [&json](PropKind kind, std::string_view element, std::string_view name,
+                    std::string_view value) { writeProp(json, kind, element, name, value); });
+        json.endArray();
+        writeDiagnostics(json, session);
+        json.endObject().finish();
+        emit(options, out);
     } else {
-        emit(options, propsText(props));
+        forEachHolderProp(
+            session, holders,
+            [&out](PropKind kind, std::string_view element, std::string_view name,
+                   std::string_view value) { appendPropLine(out, kind, element, name, value); });
+        emit(options, out);
         printDiagnostics(session);
     }
     return session.errorCount() == 0 ? kExitOk : kExitErrors;
@@ -311,57 +352,77 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
 int runTrim(const std::string& file, const std::vector<std::string>& elements,
             const OutputOptions& options) {
     Session session;
-    json empty = {{"withdrawn", json::array()},
-                  {"trashed", json::array()},
-                  {"groups", json::array()},
-                  {"specs", json::array()},
-                  {"refs", json::array()}};
-    if (!loadAndBuild(session, {file}, options, empty))
+    auto emptyProduct = [](JsonWriter& json) {
+        json.key("withdrawn").beginArray().endArray();
+        json.key("trashed").beginArray().endArray();
+        writeEmptyLists(json);
+    };
+    if (!loadAndBuild(session, {file}, options, emptyProduct))
         return kExitErrors;
 
-    json withdrawn = json::array();
-    std::vector<std::string> seen;
-    for (const std::string& element : elements) {
-        if (std::find(seen.begin(), seen.end(), element) != seen.end())
-            continue; // named twice: the first time took every record
-        seen.push_back(element);
-        int count = session.withdraw(element);
-        withdrawn.push_back({{"element", element}, {"records", count}});
-        if (count == 0)
+    // An element named twice: the first time took every record.
+    std::vector<std::string> unique;
+    std::unordered_set<std::string_view> seen;
+    for (const std::string& element : elements)
+        if (seen.insert(element).second)
+            unique.push_back(element);
+    std::vector<int> counts = session.withdraw(unique);
+    for (std::size_t i = 0; i < unique.size(); ++i) {
+        if (counts[i] == 0)
             session.addDiagnostic(
                 {session.displayFile(),
                  0,
                  Severity::Warning,
-                 "no reference record of element " + inQuotes(element) + " to remove",
+                 "no reference record of element " + inQuotes(unique[i]) + " to remove",
                  {}});
     }
 
-    json trashed = json::array();
-    std::string trashedText;
-    session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
-        TrimReasonText why = trimReasonText(reason);
-        std::string cls = objectClass(obj);
-        std::string name = objectName(obj);
-        trashed.push_back({{"class", cls},
-                           {"name", name},
-                           {"reason", why.key},
-                           {"explanation", why.explanation}});
-        trashedText += "# trashed " + cls + " " + inQuotes(name) + ": " + why.explanation + "\n";
+    struct Trashed {
+        const char* cls;
+        std::string name;
+        TrimReasonText why;
+    };
+    std::vector<Trashed> trashed;
+    session.design().onTrashed = [&trashed](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
+        trashed.push_back({objectClass(obj), objectName(obj), trimReasonText(reason)});
     };
     session.design().trim();
     session.design().onTrashed = nullptr;
 
-    std::vector<OutProp> props = canonicalProps(session);
+    std::string out = outputBuffer(session, options);
     if (options.json) {
-        PropLists lists = propLists(props);
-        emit(options, dumpJson({{"withdrawn", withdrawn},
-                                {"trashed", trashed},
-                                {"groups", lists.groups},
-                                {"specs", lists.specs},
-                                {"refs", lists.refs},
-                                {"diagnostics", diagnosticsJson(session)}}));
+        JsonWriter json(out);
+        json.beginObject().key("withdrawn").beginArray();
+        for (std::size_t i = 0; i < unique.size(); ++i)
+            json.beginObject()
+                .member("element", unique[i])
+                .member("records", counts[i])
+                .endObject();
+        json.endArray().key("trashed").beginArray();
+        for (const Trashed& entry : trashed)
+            json.beginObject()
+                .member("class", entry.cls)
+                .member("name", entry.name)
+                .member("reason", entry.why.key)
+                .member("explanation", entry.why.explanation)
+                .endObject();
+        json.endArray();
+        writeCanonicalLists(json, session);
+        writeDiagnostics(json, session);
+        json.endObject().finish();
+        emit(options, out);
     } else {
-        emit(options, trashedText + propsText(props));
+        for (const Trashed& entry : trashed) {
+            out += "# trashed ";
+            out += entry.cls;
+            out += ' ';
+            out += inQuotes(entry.name);
+            out += ": ";
+            out += entry.why.explanation;
+            out += '\n';
+        }
+        appendCanonicalText(out, session);
+        emit(options, out);
         printDiagnostics(session);
     }
     return session.errorCount() == 0 ? kExitOk : kExitErrors;
@@ -371,7 +432,7 @@ int runGraph(const std::string& file, const OutputOptions& options) {
     Session session;
     OutputOptions textOnly = options;
     textOnly.json = false;
-    if (!loadAndBuild(session, {file}, textOnly, {}))
+    if (!loadAndBuild(session, {file}, textOnly, JsonMembers()))
         return kExitErrors;
     std::ostringstream dot;
     writeDot(dot, session.design());

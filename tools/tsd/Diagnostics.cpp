@@ -1,10 +1,10 @@
 #include "Diagnostics.h"
 
 #include <algorithm>
-#include <map>
+#include <memory>
 #include <ostream>
-#include <regex>
-#include <set>
+#include <unordered_map>
+#include <unordered_set>
 
 namespace tsd_cli {
 
@@ -38,80 +38,105 @@ std::string asLibraryText(const std::string& text) {
 }
 
 // Messages issued outside any stored property quote the names they are about.
-// Each pattern says which line stands for the quoted name.
+// Each pattern says which record stands for the quoted name.
 enum class Target {
-    GroupNaming,   // first group line whose value names it
-    GroupDefining, // first group line defining it
-    SpecDefining,  // first spec line with that name
-    RegGroupUser,  // first TS_OFFSET reference, else spec line, naming it
-    ClockUser,     // first spec line or TS_OFFSET/TS_FEEDBACK reference naming it
+    GroupNaming,   // first group record whose value names it
+    GroupDefining, // first group record defining it
+    SpecDefining,  // first spec record with that name
+    RegGroupUser,  // first TS_OFFSET reference, else spec record, naming it
+    ClockUser,     // first spec record or TS_OFFSET/TS_FEEDBACK reference naming it
     TigReference,  // first TS_TIG reference whose value is it
 };
 
+// A message that begins with `prefix`, then the name, then `before`, and
+// when `after` is not empty, `after` later on the same line. The name is
+// the longest that fits, as a greedy `prefix(.*)before` (or
+// `prefix(.*)before.*after`) match of the first line would capture.
 struct NamePattern {
-    std::regex pattern;
+    std::string_view prefix;
+    std::string_view before;
+    std::string_view after;
     Target target;
 };
 
-const std::vector<NamePattern>& namePatterns() {
-    static const std::vector<NamePattern> patterns = {
-        {std::regex("^A group named \"(.*)\" was referenced in one or more TIMEGRP definitions"),
-         Target::GroupNaming},
-        {std::regex("^Circular group definition encountered from user group \"(.*)\", as"),
-         Target::GroupDefining},
-        {std::regex("^Group \"(.*)\" is used as the register group in one or more OFFSET"),
-         Target::RegGroupUser},
-        {std::regex("^The following spec\\(s\\) referenced the Tsd_ClkGroup \"(.*)\", but no "
-                    "such TS_CLKGRP"),
-         Target::ClockUser},
-        {std::regex("^Specification \"(.*)\" is defined in terms of a specification with TSid"),
-         Target::SpecDefining},
-        {std::regex("^Specification \"(.*)\" is defined in terms of specification \".*\", which "
-                    "is an ignored path"),
-         Target::SpecDefining},
-        {std::regex("^Delay expression for specification \"(.*)\" contains a division by zero"),
-         Target::SpecDefining},
-        {std::regex("^Specification \"(.*)\" is defined in terms of a circular TSid link"),
-         Target::SpecDefining},
-        {std::regex("^One or more TIG directives were specified for a specification with TSid "
-                    "\"(.*)\", which does not exist"),
-         Target::TigReference},
-    };
-    return patterns;
+constexpr NamePattern kNamePatterns[] = {
+    {"A group named \"", "\" was referenced in one or more TIMEGRP definitions", "",
+     Target::GroupNaming},
+    {"Circular group definition encountered from user group \"", "\", as", "",
+     Target::GroupDefining},
+    {"Group \"", "\" is used as the register group in one or more OFFSET", "",
+     Target::RegGroupUser},
+    {"The following spec(s) referenced the Tsd_ClkGroup \"", "\", but no such TS_CLKGRP", "",
+     Target::ClockUser},
+    {"Specification \"", "\" is defined in terms of a specification with TSid", "",
+     Target::SpecDefining},
+    {"Specification \"", "\" is defined in terms of specification \"",
+     "\", which is an ignored path", Target::SpecDefining},
+    {"Delay expression for specification \"", "\" contains a division by zero", "",
+     Target::SpecDefining},
+    {"Specification \"", "\" is defined in terms of a circular TSid link", "",
+     Target::SpecDefining},
+    {"One or more TIG directives were specified for a specification with TSid \"",
+     "\", which does not exist", "", Target::TigReference},
+};
+
+bool quotedName(std::string_view text, const NamePattern& pattern, std::string_view& name) {
+    std::string_view line = text.substr(0, text.find_first_of("\n\r"));
+    const std::size_t start = pattern.prefix.size();
+    if (line.substr(0, start) != pattern.prefix)
+        return false;
+    std::size_t limit = line.size(); // where `before` ends at the latest
+    if (!pattern.after.empty()) {
+        limit = line.rfind(pattern.after);
+        if (limit == std::string_view::npos)
+            return false;
+    }
+    if (limit < start + pattern.before.size())
+        return false;
+    std::size_t at = line.rfind(pattern.before, limit - pattern.before.size());
+    if (at == std::string_view::npos || at < start)
+        return false;
+    name = line.substr(start, at - start);
+    return true;
 }
 
-bool isRefNamed(const PropLine& prop, const char* name) {
-    if (prop.kind != PropKind::Ref || prop.name.size() != std::char_traits<char>::length(name))
+bool isRefNamed(std::string_view name, const char* wanted) {
+    if (name.size() != std::char_traits<char>::length(wanted))
         return false;
-    for (std::size_t i = 0; i < prop.name.size(); ++i)
-        if (std::toupper(static_cast<unsigned char>(prop.name[i])) != name[i])
+    for (std::size_t i = 0; i < name.size(); ++i)
+        if (std::toupper(static_cast<unsigned char>(name[i])) != wanted[i])
             return false;
     return true;
 }
 
-// The first line that defines or names each word, per kind of line, made in
-// one pass so that many messages cost no more than a few.
+constexpr std::size_t kNone = static_cast<std::size_t>(-1);
+
+// The first record that defines or names each word, per kind of record,
+// made in one pass so that many messages cost no more than a few.
 class NameIndex {
 public:
-    explicit NameIndex(const std::vector<PropLine>& props) {
-        for (const PropLine& prop : props) {
-            if (prop.kind == PropKind::Group) {
-                m_groupDefining.emplace(prop.name, &prop);
-                addWords(m_groupNaming, prop);
-            } else if (prop.kind == PropKind::Spec) {
-                m_specDefining.emplace(prop.name, &prop);
-                addWords(m_specNaming, prop);
-            } else if (isRefNamed(prop, "TS_OFFSET")) {
-                addWords(m_offsetRefNaming, prop);
-            } else if (isRefNamed(prop, "TS_FEEDBACK")) {
-                addWords(m_feedbackRefNaming, prop);
-            } else if (isRefNamed(prop, "TS_TIG")) {
-                m_tigRefs.emplace(prop.value, &prop);
+    explicit NameIndex(const PropStore& store) {
+        for (std::size_t i = 0; i < store.size(); ++i) {
+            const StoredProp& record = store[i];
+            std::string_view name = store.name(record);
+            std::string_view value = store.value(record);
+            if (record.kind == PropKind::Group) {
+                m_groupDefining.emplace(name, i);
+                addWords(m_groupNaming, value, i);
+            } else if (record.kind == PropKind::Spec) {
+                m_specDefining.emplace(name, i);
+                addWords(m_specNaming, value, i);
+            } else if (isRefNamed(name, "TS_OFFSET")) {
+                addWords(m_offsetRefNaming, value, i);
+            } else if (isRefNamed(name, "TS_FEEDBACK")) {
+                addWords(m_feedbackRefNaming, value, i);
+            } else if (isRefNamed(name, "TS_TIG")) {
+                m_tigRefs.emplace(value, i);
             }
         }
     }
 
-    const PropLine* find(Target target, const std::string& name) const {
+    std::size_t find(Target target, std::string_view name) const {
         switch (target) {
         case Target::GroupNaming:
             return lookup(m_groupNaming, name);
@@ -120,34 +145,28 @@ public:
         case Target::SpecDefining:
             return lookup(m_specDefining, name);
         case Target::RegGroupUser:
-            return first(lookup(m_offsetRefNaming, name), lookup(m_specNaming, name));
+            return std::min(lookup(m_offsetRefNaming, name), lookup(m_specNaming, name));
         case Target::ClockUser:
-            return first(first(lookup(m_specNaming, name), lookup(m_offsetRefNaming, name)),
-                         lookup(m_feedbackRefNaming, name));
+            return std::min({lookup(m_specNaming, name), lookup(m_offsetRefNaming, name),
+                             lookup(m_feedbackRefNaming, name)});
         case Target::TigReference:
             return lookup(m_tigRefs, name);
         }
-        return nullptr;
+        return kNone;
     }
 
 private:
-    using Index = std::map<std::string, const PropLine*>;
+    // Words are looked up by value; the records' texts outlive the index.
+    using Index = std::unordered_map<std::string, std::size_t>;
 
-    static void addWords(Index& index, const PropLine& prop) {
-        for (std::string& word : valueWords(prop.value))
-            index.emplace(std::move(word), &prop); // the first line keeps the word
+    static void addWords(Index& index, std::string_view value, std::size_t record) {
+        for (std::string& word : valueWords(value))
+            index.emplace(std::move(word), record); // the first record keeps the word
     }
-    static const PropLine* lookup(const Index& index, const std::string& name) {
-        auto found = index.find(name);
-        return found != index.end() ? found->second : nullptr;
-    }
-    // The earlier of two lines (lines are in input order in one vector).
-    static const PropLine* first(const PropLine* a, const PropLine* b) {
-        if (a == nullptr)
-            return b;
-        if (b == nullptr)
-            return a;
-        return a < b ? a : b;
+    // kNone, the largest index, when absent: the earlier of two is the min.
+    static std::size_t lookup(const Index& index, std::string_view name) {
+        auto found = index.find(std::string(name));
+        return found != index.end() ? found->second : kNone;
     }
 
     Index m_groupDefining;
@@ -159,12 +178,28 @@ private:
     Index m_tigRefs;
 };
 
-const PropLine* lineForQuotedName(const NameIndex& index, const std::string& text) {
-    std::smatch match;
-    for (const NamePattern& pattern : namePatterns())
-        if (std::regex_search(text, match, pattern.pattern))
-            return index.find(pattern.target, match[1].str());
-    return nullptr;
+std::size_t recordForQuotedName(const PropStore& store, std::unique_ptr<NameIndex>& index,
+                                const std::string& text) {
+    std::string_view name;
+    for (const NamePattern& pattern : kNamePatterns) {
+        if (quotedName(text, pattern, name)) {
+            if (!index)
+                index = std::make_unique<NameIndex>(store);
+            return index->find(pattern.target, name);
+        }
+    }
+    return kNone;
+}
+
+// The group and spec records of each processing context, in input order.
+using ContextLines = std::unordered_map<std::string, std::vector<std::size_t>>;
+
+ContextLines contextLines(const PropStore& store) {
+    ContextLines lines;
+    for (std::size_t i = 0; i < store.size(); ++i)
+        if (store[i].kind != PropKind::Ref)
+            lines[processingContext(store, store[i])].push_back(i);
+    return lines;
 }
 
 } // namespace
@@ -207,31 +242,33 @@ void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
     diags.push_back(std::move(diag));
 }
 
-std::string processingContext(const PropLine& prop) {
-    const char* what = prop.kind == PropKind::Group ? "TIMEGRP" : "TIMESPEC";
-    return asLibraryText(std::string("Processing ") + what + " definition \"" + prop.name + "=" +
-                         prop.value + "\": ");
+std::string processingContext(const PropStore& store, const StoredProp& record) {
+    const char* what = record.kind == PropKind::Group ? "TIMEGRP" : "TIMESPEC";
+    std::string context = std::string("Processing ") + what + " definition \"";
+    context += store.name(record);
+    context += '=';
+    context += store.value(record);
+    context += "\": ";
+    return asLibraryText(context);
 }
 
-std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& props,
+std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
                                                const std::vector<RawMessage>& messages,
                                                const std::string& fallbackFile) {
     std::vector<Diagnostic> diags;
-    // The stored lines of each context, in input order.
-    std::map<std::string, std::vector<int>> linesOf;
-    for (std::size_t i = 0; i < props.size(); ++i)
-        if (props[i].kind != PropKind::Ref)
-            linesOf[processingContext(props[i])].push_back(static_cast<int>(i));
-    NameIndex names(props);
+    // Made on first need: a build without messages costs nothing here.
+    std::unique_ptr<ContextLines> linesOf;
+    std::unique_ptr<NameIndex> names;
 
-    // Stored lines are processed in order, groups before specs, so the line
-    // of a context never lies before the line of the previous message of
-    // that kind. Identical lines share a context: a message stays on the
-    // line of the previous one unless that line already got the same text.
-    std::map<PropKind, int> cursor;
+    // Stored records are processed in order, groups before specs, so the
+    // record of a context never lies before the record of the previous
+    // message of that kind. Identical records share a context: a message
+    // stays on the record of the previous one unless that record already
+    // got the same text.
+    std::size_t cursor[3] = {kNone, kNone, kNone}; // per PropKind; kNone: none yet
     std::string previousContext;
-    int previousLine = -1;
-    std::map<int, std::set<std::string>> textsOnLine;
+    std::size_t previousLine = kNone;
+    std::unordered_map<std::size_t, std::unordered_set<std::string>> textsOnLine;
 
     for (const RawMessage& message : messages) {
         bool isDetail = message.severity == MessageSeverity::Status && !message.text.empty() &&
@@ -240,68 +277,88 @@ std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& prop
             addLibraryMessage(diags, message.severity, message.text, "", 0);
             continue;
         }
-        const PropLine* prop = nullptr;
+        std::size_t chosen = kNone;
         if (!message.context.empty()) {
-            int chosen = -1;
-            if (message.context == previousContext && previousLine >= 0 &&
+            if (message.context == previousContext && previousLine != kNone &&
                 textsOnLine[previousLine].count(message.text) == 0) {
                 chosen = previousLine;
-            } else if (auto found = linesOf.find(message.context); found != linesOf.end()) {
-                const std::vector<int>& candidates = found->second;
-                PropKind kind = props[static_cast<std::size_t>(candidates.front())].kind;
-                int after = cursor.count(kind) != 0 ? cursor[kind] : -1;
-                auto next = std::upper_bound(candidates.begin(), candidates.end(), after);
-                if (next != candidates.end())
-                    chosen = *next;
-                else
-                    chosen = previousContext == message.context ? previousLine : candidates.front();
-                cursor[kind] = std::max(after, chosen);
+            } else {
+                if (!linesOf)
+                    linesOf = std::make_unique<ContextLines>(contextLines(store));
+                auto found = linesOf->find(message.context);
+                if (found != linesOf->end()) {
+                    const std::vector<std::size_t>& candidates = found->second;
+                    auto kind = static_cast<std::size_t>(store[candidates.front()].kind);
+                    std::size_t after = cursor[kind];
+                    auto next = after == kNone
+                                    ? candidates.begin()
+                                    : std::upper_bound(candidates.begin(), candidates.end(), after);
+                    if (next != candidates.end())
+                        chosen = *next;
+                    else
+                        chosen =
+                            previousContext == message.context ? previousLine : candidates.front();
+                    if (chosen != kNone && (after == kNone || chosen > after))
+                        cursor[kind] = chosen;
+                }
             }
             previousContext = message.context;
             previousLine = chosen;
-            if (chosen >= 0) {
+            if (chosen != kNone)
                 textsOnLine[chosen].insert(message.text);
-                prop = &props[static_cast<std::size_t>(chosen)];
-            }
         } else {
             previousContext.clear();
-            previousLine = -1;
-            prop = lineForQuotedName(names, message.text);
+            previousLine = kNone;
+            chosen = recordForQuotedName(store, names, message.text);
         }
-        if (prop != nullptr)
-            addLibraryMessage(diags, message.severity, message.text, prop->file, prop->line);
-        else
+        if (chosen != kNone) {
+            const StoredProp& record = store[chosen];
+            addLibraryMessage(diags, message.severity, message.text, store.fileName(record),
+                              static_cast<int>(record.line));
+        } else {
             addLibraryMessage(diags, message.severity, message.text, fallbackFile, 0);
+        }
     }
     return diags;
 }
 
-void printDiagnostic(std::ostream& out, const Diagnostic& diag) {
+void appendDiagnostic(std::string& out, const Diagnostic& diag) {
     if (!diag.file.empty()) {
-        out << diag.file << ':';
-        if (diag.line > 0)
-            out << diag.line << ':';
+        out += diag.file;
+        out += ':';
+        if (diag.line > 0) {
+            out += std::to_string(diag.line);
+            out += ':';
+        }
     } else {
-        out << "tsd:";
+        out += "tsd:";
     }
-    out << ' ' << severityName(diag.severity) << ": ";
+    out += ' ';
+    out += severityName(diag.severity);
+    out += ": ";
     // Continuation lines (an echoed definition and its caret line) move
     // right together, so the caret stays under the same character.
-    std::size_t start = 0;
-    bool first = true;
-    for (;;) {
-        std::size_t end = diag.text.find('\n', start);
-        std::string line = diag.text.substr(start, end == std::string::npos ? end : end - start);
+    std::string_view text = diag.text;
+    for (bool first = true;; first = false) {
+        std::size_t end = text.find('\n');
         if (!first)
-            out << "   ";
-        out << line << '\n';
-        first = false;
-        if (end == std::string::npos)
+            out += "   ";
+        out += text.substr(0, end);
+        out += '\n';
+        if (end == std::string_view::npos)
             break;
-        start = end + 1;
+        text.remove_prefix(end + 1);
     }
-    for (const std::string& detail : diag.details)
-        out << detail << '\n';
+    for (const std::string& detail : diag.details) {
+        out += detail;
+        out += '\n';
+    }
+}
+
+void printDiagnostic(std::ostream& out, const Diagnostic& diag) {
+    std::string text;
+    appendDiagnostic(text, diag);
+    out << text;
 }
 
 } // namespace tsd_cli

@@ -39,19 +39,21 @@ struct RawMessage {
 void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
                        const std::string& text, const std::string& file, int line);
 
-// The context under which the builder processes a stored group or spec line.
-std::string processingContext(const PropLine& prop);
+// The context under which the builder processes a stored group or spec record.
+std::string processingContext(const PropStore& store, const StoredProp& record);
 
-// Ties the messages of a build to the lines of `props` (in the order they were
-// handed to the builder): messages issued while a stored property was
-// processed go to the line with that context; the others go to the line
+// Ties the messages of a build to the records of `store` (in the order they
+// were handed to the builder): messages issued while a stored property was
+// processed go to the record with that context; the others go to the record
 // that defines or names what they quote, when it can be found. Messages tied
-// to no line name `fallbackFile` (which may be empty).
-std::vector<Diagnostic> attributeBuildMessages(const std::vector<PropLine>& props,
+// to no record name `fallbackFile` (which may be empty). Costs nothing
+// without messages; the indexes it needs are made on first need.
+std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
                                                const std::vector<RawMessage>& messages,
                                                const std::string& fallbackFile);
 
 // "FILE:LINE: error: text", continuation lines and detail lines indented.
+void appendDiagnostic(std::string& out, const Diagnostic& diag);
 void printDiagnostic(std::ostream& out, const Diagnostic& diag);
 
 } // namespace tsd_cli

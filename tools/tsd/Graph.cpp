@@ -4,9 +4,9 @@
 
 #include "tsd/Tsd.h"
 
-#include <map>
 #include <ostream>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 namespace tsd_cli {
@@ -175,7 +175,7 @@ private:
 
     std::ostream& m_out;
     Tsd_Design& m_design;
-    std::map<Tsd_BaseObj*, std::string> m_ids;
+    std::unordered_map<Tsd_BaseObj*, std::string> m_ids;
 };
 
 } // namespace

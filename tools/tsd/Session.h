@@ -1,6 +1,22 @@
-// One run of the tool over a set of property files: reads them, hands every
-// property to a builder, builds the design and keeps every message, tied to
-// its line.
+// One run of the tool over a set of input files: keeps their text, hands
+// every property record to a builder, builds the design and keeps every
+// message, tied to its line.
+//
+// Reading property files:
+//   session.load(paths);             // or load(inputs) for texts in memory
+//   session.build();
+//
+// A reader of another input format feeds the same records:
+//   std::uint32_t file = session.addFile(std::move(input));
+//   std::string_view text = session.store().fileText(file);
+//   StoredProp record;               // kind, file, line, column and spans:
+//   record.name = session.store().spanIn(file, nameInText);   // text as is
+//   record.value = session.store().keep(madeValue);            // or a copy
+//   record.inArena |= StoredProp::Value;
+//   session.add(record);             // messages of the hand-over go to its line
+//   ...
+//   session.build();
+// Records are handed to the builder in the order they are added.
 #pragma once
 
 #include "Diagnostics.h"
@@ -8,13 +24,17 @@
 
 #include "tsd/Tsd.h"
 
+#include <cstdint>
 #include <functional>
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace tsd_cli {
+
+class Session;
 
 // A file that cannot be read (or written); the tool exits with 2.
 class IoError : public std::runtime_error {
@@ -22,16 +42,35 @@ public:
     using std::runtime_error::runtime_error;
 };
 
-// The reference record of one netlist element named on a `ref` line.
+// The reference record of the netlist element that a `ref` record names. It
+// points back at its record instead of copying the element; when the library
+// deletes it, the session forgets it.
 class CliRef : public Tsd_Ref {
 public:
-    explicit CliRef(std::string element) : m_element(std::move(element)) {}
+    CliRef(const Session& session, std::size_t record);
+    ~CliRef() override;
+    CliRef(const CliRef&) = delete;
+    CliRef& operator=(const CliRef&) = delete;
+    // A design holds one per reference line and deletes them all at the
+    // end: they come from a pool.
+    static void* operator new(std::size_t size);
+    static void operator delete(void* block, std::size_t size);
+
     bool isEqual(const Tsd_Ref* other) const override;
     void dump(DumpStream& stream, short indent) const override;
-    const std::string& element() const { return m_element; }
+    std::string_view element() const;
+    std::size_t record() const { return m_record; }
 
 private:
-    std::string m_element;
+    friend class Session;
+
+    Session& session() const;
+
+    // A design holds one of these per reference line: the session by its
+    // number and the record by its index keep it as small as the library's
+    // own part.
+    std::uint32_t m_session;
+    std::uint32_t m_record;
 };
 
 // A design that tells the session what trimming removes.
@@ -49,12 +88,6 @@ class CliBuilder : public Tsd_Builder {
 public:
     explicit CliBuilder(Tsd_Design* design) : Tsd_Builder(false) { initBaseBuilder(design); }
     std::string context() const { return utf16ToUtf8(getContext()); }
-};
-
-// The record of one `ref` line.
-struct RefRecord {
-    std::size_t prop = 0;  // index into Session::props()
-    CliRef* ref = nullptr; // while an object owns it; the object deletes it
 };
 
 // "-" names standard input.
@@ -78,11 +111,24 @@ public:
     // hands their lines to the builder in order.
     void load(const std::vector<std::string>& paths);
     void load(std::vector<InputFile> inputs);
+
+    // Keeps the text of a file read in another format; its index in the
+    // store. Throws IoError when the files together pass PropStore::kMaxText.
+    std::uint32_t addFile(InputFile input);
+    // Stores a record and hands it to the builder.
+    void add(const StoredProp& record);
+    PropStore& store() { return m_store; }
+    const PropStore& store() const { return m_store; }
+
     // Builds the design; true when it was built and no error was reported.
     bool build();
 
-    const std::vector<PropLine>& props() const { return m_props; }
-    std::vector<RefRecord>& refs() { return m_refs; }
+    // The reference record that an object owns for record `index`, or null
+    // (not a `ref` record, refused, or withdrawn).
+    CliRef* refOf(std::size_t index) const { return m_refOf[index]; }
+    // The records whose reference records `owner` holds, in input order.
+    std::vector<std::size_t> recordsOwnedBy(Tsd_BaseObj* owner) const;
+
     const std::vector<Diagnostic>& diagnostics() const { return m_diags; }
     int errorCount() const;
     int warningCount() const;
@@ -97,9 +143,10 @@ public:
 
     void addDiagnostic(Diagnostic diag) { m_diags.push_back(std::move(diag)); }
 
-    // Withdraws every record of `element` that an object still owns; the
-    // number withdrawn.
-    int withdraw(const std::string& element);
+    // Withdraws every record of each element that an object still owns,
+    // element by element, each in input order; the number withdrawn per
+    // element (0 for an element named again).
+    std::vector<int> withdraw(const std::vector<std::string>& elements);
 
     // Called when the library delivers a fatal message, after it has been
     // added to the diagnostics; the process ends with the message's code when
@@ -109,23 +156,36 @@ public:
     void deliver(const MessageRecord& record) override;
 
 private:
-    void feed(const PropLine& prop);
+    friend class CliRef;
+
+    void readPropFile(std::uint32_t file);
+    void feed(std::size_t index);
+    void lineError(const StoredProp& record, std::string text);
     void attributeBuildMessages();
 
     ScopedMessageSink m_sinkGuard{this};
-    std::vector<PropLine> m_props;
-    std::vector<RefRecord> m_refs;
+    std::uint32_t m_number = 0; // among the live sessions
+    PropStore m_store;
+    // Parallel to the records; cleared by a CliRef that dies.
+    std::vector<CliRef*> m_refOf;
+    std::size_t m_textSize = 0;
     std::vector<Diagnostic> m_diags;
     std::vector<RawMessage> m_buildMessages;
     std::string m_displayFile;
     std::vector<std::string> m_fileNames;
-    // The line whose property is being handed over, or -1.
-    int m_currentProp = -1;
+    // The record being handed over, or -1.
+    std::ptrdiff_t m_currentRecord = -1;
+    // Reused for the zero-terminated name and value of each hand-over.
+    std::string m_name;
+    std::string m_value;
+    std::string m_lastRefProp; // the last name taken as a reference property
     bool m_building = false;
     bool m_built = false;
+    bool m_closing = false; // the design is being destroyed with the session
     std::function<void()> m_fatalHandler;
     // Declared in this order so that the design goes first: after a failed
     // build its user groups may still point at the builder's placeholders.
+    // Both go before the records, which their reference records point into.
     std::unique_ptr<CliBuilder> m_builder;
     std::unique_ptr<CliDesign> m_design;
 };

@@ -4,7 +4,9 @@
 
 #include <CLI/CLI.hpp>
 
+#include <exception>
 #include <iostream>
+#include <new>
 
 #ifndef TSD_TOOL_VERSION
 #define TSD_TOOL_VERSION "unknown"
@@ -101,6 +103,13 @@ int main(int argc, char** argv) {
         if (graph->parsed())
             return tsd_cli::runGraph(file, options);
     } catch (const tsd_cli::IoError& e) {
+        std::cerr << "tsd: error: " << e.what() << "\n";
+        return tsd_cli::kExitUsage;
+    } catch (const std::bad_alloc&) {
+        std::cerr << "tsd: error: out of memory\n";
+        return tsd_cli::kExitUsage;
+    } catch (const std::exception& e) {
+        // Input too large for the tool's records, say: a clear end, not an abort.
         std::cerr << "tsd: error: " << e.what() << "\n";
         return tsd_cli::kExitUsage;
     }
