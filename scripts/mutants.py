@@ -2,7 +2,7 @@
 """Breaks the code on purpose, one fault at a time, and tells whether the
 test suite notices each one.
 
-usage: mutants.py [--list FILE] [--build DIR] [NAME ...]
+usage: mutants.py [--list FILE] [--build DIR] [--all] [NAME ...]
 
 The faults are listed in tests/mutants.txt, one block each:
 
@@ -13,11 +13,13 @@ The faults are listed in tests/mutants.txt, one block each:
 
 Every fault is applied to a clean copy of its file, the tests are rebuilt in
 their own build folder and run until the first failure; the file is then put
-back. A fault is "caught" when a test fails or the build breaks on a test
-(a fault that breaks the library's own build is reported as such).
+back. A fault is "caught" when a test fails or the build breaks (reported as
+such). With --all every test runs, and the tests that fail are listed: that
+shows which tests guard a piece of code before one of them is dropped.
 """
 import argparse
 import os
+import re
 import subprocess
 import sys
 
@@ -56,6 +58,8 @@ def main():
     ap = argparse.ArgumentParser()
     ap.add_argument("--list", default=os.path.join(ROOT, "tests", "mutants.txt"))
     ap.add_argument("--build", default="build/mutants")
+    ap.add_argument("--all", action="store_true",
+                    help="run every test and list those that fail")
     ap.add_argument("names", nargs="*")
     args = ap.parse_args()
 
@@ -91,15 +95,25 @@ def main():
             if b.returncode != 0:
                 verdict = "caught (build)"
             else:
-                t = run(["ctest", "--test-dir", args.build, "-j2", "--stop-on-failure",
-                         "-E", "install-consumer|bench_smoke"])
+                # A fault may make a test loop: the timeout ends it as a failure.
+                cmd = ["ctest", "--test-dir", args.build, "-j2", "--timeout", "120",
+                       "-E", "install-consumer|bench_smoke"]
+                if not args.all:
+                    cmd.append("--stop-on-failure")
+                t = run(cmd)
                 verdict = "caught" if t.returncode != 0 else "MISSED"
+                if args.all and t.returncode != 0:
+                    failed = re.findall(r"^\s*\d+ - (\S+) \(", t.stdout, re.M)
+                    verdict += " by " + str(len(failed))
+                    fault["failed"] = failed
         finally:
             with open(path, "w") as f:
                 f.write(original)
         if verdict.startswith("caught"):
             caught += 1
         print(f"{fault['name']:<28} {verdict:<15} {fault['what']}", flush=True)
+        if fault.get("failed"):
+            print("    " + " ".join(fault["failed"]), flush=True)
     run(["cmake", "--build", args.build])
     print(f"{caught} of {len(faults)} faults caught")
     return 0

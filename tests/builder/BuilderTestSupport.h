@@ -8,24 +8,40 @@
 
 #include <memory>
 #include <string>
-#include <tuple>
 #include <vector>
 
 namespace tsd_test {
 
-// Builder whose protected operations tests may call.
+// A builder whose protected operations tests may call, and which may bring
+// its own design and allow later definitions to replace earlier ones.
 class OpenBuilder : public Tsd_Builder {
 public:
     using Tsd_Builder::addError;
     using Tsd_Builder::addWarning;
     using Tsd_Builder::getContext;
-    using Tsd_Builder::getUnresolvedGroupList;
     using Tsd_Builder::initBaseBuilder;
     using Tsd_Builder::resolvePendingLinks;
     using Tsd_Builder::setContext;
     using Tsd_Builder::validateUserGroups;
     explicit OpenBuilder(bool createDesign = true) : Tsd_Builder(createDesign) {}
+    OpenBuilder(Tsd_Design* design, bool allowOverride)
+        : Tsd_Builder(false), m_allowOverride(allowOverride) {
+        initBaseBuilder(design);
+    }
+
+protected:
+    bool allowUserGroupOverride(Tsd_UserGroup* existing, const char* value) override {
+        return m_allowOverride || Tsd_Builder::allowUserGroupOverride(existing, value);
+    }
+    bool allowEndpointSpecOverride(Tsd_EndpointSpec* existing, const char* value) override {
+        return m_allowOverride || Tsd_Builder::allowEndpointSpecOverride(existing, value);
+    }
+
+private:
+    bool m_allowOverride = false;
 };
+
+using NameValue = std::pair<std::string, std::string>;
 
 struct RefProp {
     std::string element, name, value;
@@ -35,23 +51,28 @@ struct RefProp {
 };
 
 struct PropSet {
-    std::vector<std::pair<std::string, std::string>> groups;
-    std::vector<std::pair<std::string, std::string>> specs;
+    std::vector<NameValue> groups;
+    std::vector<NameValue> specs;
     std::vector<RefProp> refs;
 
     bool operator==(const PropSet& o) const {
         return groups == o.groups && specs == o.specs && refs == o.refs;
     }
+    // One property a line, as a scenario file writes them.
+    std::string text() const {
+        std::string out;
+        for (const auto& g : groups)
+            out += "group " + g.first + " = " + g.second + "\n";
+        for (const auto& s : specs)
+            out += "spec " + s.first + " = " + s.second + "\n";
+        for (const RefProp& r : refs)
+            out += "ref " + r.element + " " + r.name + " = " + r.value + "\n";
+        return out;
+    }
 };
 
 inline std::ostream& operator<<(std::ostream& os, const PropSet& set) {
-    for (const auto& g : set.groups)
-        os << "group " << g.first << " = " << g.second << "\n";
-    for (const auto& s : set.specs)
-        os << "spec " << s.first << " = " << s.second << "\n";
-    for (const RefProp& r : set.refs)
-        os << "ref " << r.element << " " << r.name << " = " << r.value << "\n";
-    return os;
+    return os << set.text();
 }
 
 // The outcome of building a property set: the design (owned here) and the
@@ -80,6 +101,7 @@ struct Built {
 };
 
 // Feeds references first (they are processed at once), then groups and specs.
+// A design the builder was given stays with the caller when the build fails.
 inline Built build(const PropSet& set, Tsd_Builder& builder) {
     Built built;
     for (const RefProp& r : set.refs) {

@@ -1,71 +1,34 @@
-#include "DesignTestSupport.h"
+// The design container: lists and trash, finds, ownership and the dump; and
+// the worklists of trim() and of the finds against the walks and passes
+// they replace, on random designs. Trim cascades of built designs are in
+// the builder's scenarios.
+#include "RandomDesigns.h"
 
-#include <gtest/gtest.h>
-
+#include <cstdint>
 #include <cstring>
+#include <functional>
 #include <memory>
-#include <random>
 
-using tsd_test::attachRef;
-using tsd_test::fatalText;
-using tsd_test::MessageCapture;
+using namespace tsd_test;
+using Reason = Tsd_Design::TrimReason;
 
-namespace {
-
-std::vector<Tsd_BaseObj*> items(const Tsd_BaseObjList* list) {
-    std::vector<Tsd_BaseObj*> out;
-    Tsd_BaseObjListIter iter(list);
-    while (Tsd_BaseObj* obj = iter.next())
-        out.push_back(obj);
-    return out;
-}
-
-} // namespace
-
-TEST(Design, AddMoveAndTrashQueries) {
-    Tsd_Design design;
-    auto* a = new Tsd_TNMGroup("a");
-    auto* b = new Tsd_UserGroup("b");
-    design.addGroup(a);
-    design.addGroup(b);
-    design.addGroup(nullptr); // ignored
-    EXPECT_EQ(items(design.getGroupList()), (std::vector<Tsd_BaseObj*>{a, b}));
-
-    EXPECT_TRUE(design.moveGroupToTrash(a));
-    EXPECT_TRUE(design.isGroupTrashed(a));
-    EXPECT_FALSE(design.isGroupTrashed(b));
-    EXPECT_FALSE(design.isGroupTrashed(nullptr));
-    // Already trashed: nothing changes.
-    EXPECT_FALSE(design.moveGroupToTrash(a));
-    EXPECT_EQ(items(design.getGroupTrash()), (std::vector<Tsd_BaseObj*>{a}));
-    EXPECT_EQ(items(design.getGroupList()), (std::vector<Tsd_BaseObj*>{b}));
-    EXPECT_EQ(design.getGroupList()->getCount(), 2); // the hole stays
-    // A null argument never removes a hole.
-    EXPECT_FALSE(design.moveGroupToTrash(nullptr));
-    EXPECT_EQ(design.getGroupTrash()->getCount(), 1);
-
-    auto* spec = new Tsd_Period("TS01");
-    design.addEndpointSpec(spec);
-    EXPECT_TRUE(design.moveEndpointSpecToTrash(spec));
-    EXPECT_TRUE(design.isEndpointSpecTrashed(spec));
-    auto* control = new Tsd_PathControl("d1", true);
-    design.addPathControl(control);
-    EXPECT_FALSE(design.isPathControlTrashed(control));
-    EXPECT_TRUE(design.movePathControlToTrash(control));
-    EXPECT_TRUE(design.isPathControlTrashed(control));
-}
-
-TEST(Design, FindsCompareExactlyAndSearchTrashOnlyWhenAsked) {
+TEST(Design, ListsTrashAndFinds) {
     Tsd_Design design;
     auto* first = new Tsd_TNMGroup("clk");
     auto* second = new Tsd_UserGroup("clk");
     auto* unnamed = new Tsd_UserGroup(nullptr);
     auto* gone = new Tsd_TNMGroup("gone");
-    design.addGroup(unnamed);
-    design.addGroup(first);
-    design.addGroup(second);
-    design.addGroup(gone);
-    design.moveGroupToTrash(gone);
+    for (Tsd_Group* g : {static_cast<Tsd_Group*>(unnamed), static_cast<Tsd_Group*>(first),
+                         static_cast<Tsd_Group*>(second), static_cast<Tsd_Group*>(gone)})
+        design.addGroup(g);
+    design.addGroup(nullptr); // ignored
+    EXPECT_TRUE(design.moveGroupToTrash(gone));
+    EXPECT_FALSE(design.moveGroupToTrash(gone));    // already trashed: nothing changes
+    EXPECT_FALSE(design.moveGroupToTrash(nullptr)); // never removes a hole
+    EXPECT_TRUE(design.isGroupTrashed(gone));
+    EXPECT_FALSE(design.isGroupTrashed(first) || design.isGroupTrashed(nullptr));
+    EXPECT_EQ(objects(design.getGroupTrash()), (std::vector<Tsd_BaseObj*>{gone}));
+    EXPECT_EQ(design.getGroupList()->getCount(), 4); // the hole stays
 
     EXPECT_EQ(design.findGroupByUserName("clk", false), first); // the first added wins
     EXPECT_EQ(design.findGroupByUserName("CLK", false), nullptr);
@@ -77,13 +40,14 @@ TEST(Design, FindsCompareExactlyAndSearchTrashOnlyWhenAsked) {
     design.addClockGroup(clock);
     EXPECT_EQ(design.findClockGroupByNetName("clk_net", false), clock);
     EXPECT_EQ(design.findClockGroupByNetName("clk", false), nullptr);
+    EXPECT_TRUE(design.moveClockGroupToTrash(clock));
+    EXPECT_EQ(design.findClockGroupByNetName("clk_net", true), clock);
 
     auto* global = new Tsd_TIGGroup(nullptr);
     auto* tig = new Tsd_TIGGroup("TS01");
     auto* upper = new Tsd_TIGGroup("GLOBAL");
-    design.addTIGGroup(upper);
-    design.addTIGGroup(tig);
-    design.addTIGGroup(global);
+    for (Tsd_TIGGroup* g : {upper, tig, global})
+        design.addTIGGroup(g);
     EXPECT_EQ(design.findTIGByTSid(nullptr, false), global);
     EXPECT_EQ(design.findTIGByTSid("", false), global);
     EXPECT_EQ(design.findTIGByTSid("TS01", false), tig);
@@ -93,29 +57,51 @@ TEST(Design, FindsCompareExactlyAndSearchTrashOnlyWhenAsked) {
     auto* trashedSpec = new Tsd_Period("TS02");
     design.addEndpointSpec(path);
     design.addEndpointSpec(trashedSpec);
-    design.moveEndpointSpecToTrash(trashedSpec);
+    EXPECT_TRUE(design.moveEndpointSpecToTrash(trashedSpec));
+    EXPECT_TRUE(design.isEndpointSpecTrashed(trashedSpec));
     EXPECT_EQ(design.findEndpointSpecByTSid("TS01", false), path);
     EXPECT_EQ(design.findEndpointSpecByTSid("TS02", false), nullptr);
     EXPECT_EQ(design.findEndpointSpecByTSid("TS02", true), trashedSpec);
     EXPECT_EQ(design.findEndpointSpecByTSid("ts01", true), nullptr);
+
+    auto* control = new Tsd_PathControl("d1", true);
+    design.addPathControl(control);
+    EXPECT_FALSE(design.isPathControlTrashed(control));
+    EXPECT_TRUE(design.movePathControlToTrash(control));
+    EXPECT_TRUE(design.isPathControlTrashed(control));
 }
 
-TEST(Design, AnObjectOfTheWrongClassInATypedListIsFatal) {
+TEST(Design, WrongObjectsInTypedListsAreFatal) {
     MessageCapture capture;
     Tsd_Design design;
     design.getGroupList()->addObj(new Tsd_Period("TS01"));
     design.getClockGroupList()->addObj(new Tsd_TNMGroup("t"));
     design.getTIGGroupList()->addObj(new Tsd_ClkGroup("c"));
     design.getEndpointSpecList()->addObj(new Tsd_Offset());
-    int code = 0;
-    EXPECT_EQ(fatalText([&] { design.findGroupByUserName("x", false); }, &code),
-              "Non-group object.\n");
-    EXPECT_EQ(code, 2);
-    EXPECT_EQ(fatalText([&] { design.findClockGroupByNetName("x", false); }),
-              "Non-clock group object.\n");
-    EXPECT_EQ(fatalText([&] { design.findTIGByTSid("x", false); }), "Non-TIG object.\n");
-    EXPECT_EQ(fatalText([&] { design.findEndpointSpecByTSid("x", false); }),
-              "Non-endpoint spec object.\n");
+    Tsd_Design trash;
+    trash.getEndpointSpecTrash()->addObj(new Tsd_UserGroup("not_a_spec"));
+    Tsd_TNMGroup g("g");
+    const struct {
+        std::function<void()> misuse;
+        const char* message;
+    } cases[] = {
+        {[&] { design.findGroupByUserName("x", false); }, "Non-group object.\n"},
+        {[&] { design.findClockGroupByNetName("x", false); }, "Non-clock group object.\n"},
+        {[&] { design.findTIGByTSid("x", false); }, "Non-TIG object.\n"},
+        {[&] { design.findEndpointSpecByTSid("x", false); }, "Non-endpoint spec object.\n"},
+        {[&] { trash.trim(); }, "Wrong object type.\n"},
+        {[&] { trash.getGroupHolders(&g, nullptr); }, "NULL list passed to getGroupHolders().\n"},
+    };
+    for (const auto& c : cases) {
+        int code = 0;
+        EXPECT_EQ(fatalText(c.misuse, &code), c.message);
+        EXPECT_EQ(code, 2);
+    }
+    // Holders are appended to what the list holds; a null group has none.
+    Tsd_BaseObjList list;
+    list.addObj(&g);
+    design.getGroupHolders(nullptr, &list);
+    EXPECT_EQ(objects(&list), (std::vector<Tsd_BaseObj*>{&g}));
 }
 
 TEST(Design, DestructionDeletesActiveAndTrashedObjectsOnce) {
@@ -141,38 +127,15 @@ TEST(Design, DestructionDeletesActiveAndTrashedObjectsOnce) {
     EXPECT_EQ(destroyed, 3);
 }
 
-TEST(Design, ReferenceTypeAndGlobalTIG) {
-    Tsd_Design plain;
-    EXPECT_EQ(plain.getRefType(), nullptr);
-    Tsd_Design typed("MM_TSREF");
-    EXPECT_STREQ(typed.getRefType(), "MM_TSREF");
-    EXPECT_EQ(typed.getGlobalTIG(), nullptr);
-    auto* tig = new Tsd_TIGGroup(nullptr);
-    typed.addTIGGroup(tig);
-    typed.setGlobalTIG(tig);
-    EXPECT_EQ(typed.getGlobalTIG(), tig);
-
-    // A derived design may set the type.
-    struct Typed : Tsd_Design {
+TEST(Design, ReferenceTypeGlobalTIGAndDumps) {
+    EXPECT_EQ(Tsd_Design().getRefType(), nullptr);
+    struct Typed : Tsd_Design { // a derived design may set the type
         Typed() { setRefType("MY_REF"); }
     } derived;
     EXPECT_STREQ(derived.getRefType(), "MY_REF");
-}
 
-TEST(Design, DumpOfAnEmptyDesign) {
-    Tsd_Design design;
-    std::string expected = "Tsd_Design\n";
-    for (const char* list : {"m_groups", "m_clockGroups", "m_tigGroups", "m_endpointSpecs",
-                             "m_offsetSpecs", "m_netSpecs", "m_pathControls", "m_portSpecs"}) {
-        expected += std::string("   ") + list + ":\n";
-        expected += "      active objects:\n      trashed objects:\n";
-    }
-    expected += "   global TIG is not installed\n";
-    EXPECT_EQ(tsd_test::dumpText(design), expected);
-}
-
-TEST(Design, DumpNestsObjectsAndNamesTheReferenceType) {
     Tsd_Design design("MM_TSREF");
+    std::string text = dumpText(design, 1);
     auto* clk = new Tsd_TNMGroup("clk");
     auto* old = new Tsd_TNMGroup("old");
     design.addGroup(clk);
@@ -180,30 +143,12 @@ TEST(Design, DumpNestsObjectsAndNamesTheReferenceType) {
     design.moveGroupToTrash(old);
     auto* global = new Tsd_TIGGroup(nullptr);
     design.addTIGGroup(global);
+    EXPECT_EQ(design.getGlobalTIG(), nullptr);
     design.setGlobalTIG(global);
-    std::string text = tsd_test::dumpText(design, 1);
-    std::string expected = "   Tsd_Design\n"
-                           "      design refType \"MM_TSREF\"\n"
-                           "      m_groups:\n"
-                           "         active objects:\n"
-                           "            Tsd_TNMGroup\n"
-                           "               name = clk\n"
-                           "               references:\n"
-                           "         trashed objects:\n"
-                           "            Tsd_TNMGroup\n"
-                           "               name = old\n"
-                           "               references:\n"
-                           "      m_clockGroups:\n"
-                           "         active objects:\n"
-                           "         trashed objects:\n"
-                           "      m_tigGroups:\n"
-                           "         active objects:\n"
-                           "            Tsd_TIGGroup\n"
-                           "               name = global\n"
-                           "               references:\n"
-                           "         trashed objects:\n";
-    EXPECT_EQ(text.substr(0, expected.size()), expected);
-    EXPECT_NE(text.find("      global TIG is installed\n"), std::string::npos);
+    EXPECT_EQ(design.getGlobalTIG(), global);
+    design.addEndpointSpec(new Tsd_DelayPath("TS01"));
+    design.addPortTiming(new Tsd_PortTiming("FEEDBACK"));
+    expectGolden("design/design.golden", text + dumpText(design, 1));
 }
 
 // The finds answer from indexes; they must agree with a walk of the lists
@@ -300,4 +245,160 @@ TEST(Design, FindsAgreeWithAWalkThroughEveryChange) {
         for (Tsd_BaseObjList* l : lists)
             l->emptyList();
     }
+}
+
+// trim() computes its cascades with worklists; these tests run the passes and
+// walks as literally described on a twin of each random design and compare
+// everything that can be seen: what is reported, in order, the messages, the
+// dumps and the exact delay values.
+namespace {
+
+std::vector<std::string> reported(const RecordingDesign& design) {
+    std::vector<std::string> out;
+    for (const auto& entry : design.trashed) {
+        Tsd_Group* group = entry.first->getGroup();
+        const char* name = group != nullptr ? group->getName() : entry.first->getSpec()->getTSid();
+        out.push_back((name != nullptr ? name : "<null>") + std::string(" ") +
+                      std::to_string(entry.second));
+    }
+    return out;
+}
+
+// The group steps of trim as literally described: reference owners, then
+// user-group passes until one trashes nothing, then the unlinking of
+// trashed members one member at a time.
+bool literalGroupTrim(RecordingDesign& design) {
+    auto trashIf = [&](Tsd_Group* group, Reason reason) {
+        if (!design.moveGroupToTrash(group))
+            return false;
+        design.trashed.emplace_back(group, reason);
+        return true;
+    };
+    bool any = false;
+    for (Tsd_BaseObj* obj : objects(design.getGroupList()))
+        if (obj->getRefList() != nullptr && obj->getRefList()->isEmpty())
+            any |= trashIf(obj->getGroup(), Tsd_Design::TRIM_NO_REFERENCES);
+    for (bool again = true; again;) {
+        again = false;
+        Tsd_BaseObjListIter pass(design.getGroupList());
+        while (Tsd_BaseObj* obj = pass.next()) {
+            Tsd_UserGroup* user = obj->getUserGroup();
+            if (user == nullptr)
+                continue;
+            bool empty = true;
+            Tsd_UserGroupIter members(user, false);
+            Tsd_UserGroup::Edge edge;
+            while (Tsd_PredefGroup* member = members.next(edge))
+                empty = empty && design.isGroupTrashed(member);
+            if (empty && trashIf(user, Tsd_Design::TRIM_EMPTY_USER_GROUP))
+                again = any = true;
+        }
+    }
+    for (Tsd_BaseObj* obj : objects(design.getGroupList())) {
+        if (Tsd_UserGroup* user = obj->getUserGroup()) {
+            for (bool exclude : {false, true}) {
+                Tsd_UserGroupIter members(user, exclude);
+                Tsd_UserGroup::Edge edge;
+                while (Tsd_PredefGroup* member = members.next(edge))
+                    if (design.isGroupTrashed(member))
+                        user->removeGroup(member, exclude);
+            }
+        }
+    }
+    return any;
+}
+
+// The unlinking of specs as literally described: the link check, then a walk
+// of the chain, spec by spec in list order.
+void literalFreeze(Tsd_Design& design) {
+    for (Tsd_BaseObj* obj : objects(design.getEndpointSpecList())) {
+        Tsd_EndpointSpec* spec = obj->getEndpointSpec();
+        if (spec->checkLink(false) != 0) {
+            MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+            continue;
+        }
+        if (!spec->isLinked())
+            continue;
+        bool computable = false, touchesTrash = false;
+        std::vector<const Tsd_EndpointSpec*> visited{spec};
+        const Tsd_EndpointSpec* current = spec;
+        for (;;) {
+            if (!current->isLinked()) {
+                computable = current->hasDelayValue();
+                break;
+            }
+            const Tsd_EndpointSpec* next = current->getLinkedSpec();
+            if ((!current->isLinkMultiplied() && current->getLinkFactor() == 0.0) ||
+                next == nullptr || std::find(visited.begin(), visited.end(), next) != visited.end())
+                break;
+            visited.push_back(next);
+            touchesTrash = touchesTrash || design.isEndpointSpecTrashed(next);
+            current = next;
+        }
+        if (touchesTrash && computable) {
+            spec->setDelayValue(spec->getDelayValue());
+            Tsd_Period* period = spec->getPeriod();
+            if (period != nullptr && period->hasPhase())
+                period->setPhase(Tsd_TimeValue(), true);
+        } else if (touchesTrash) {
+            MessageManager::debugTrace("checkLink() failed for spec %s.\n", spec->getTSid());
+        }
+    }
+}
+
+// Every spec's delay, bit for bit, and its link target.
+std::vector<std::string> delays(Tsd_Design& design) {
+    std::vector<std::string> out;
+    for (Tsd_BaseObjList* list : {design.getEndpointSpecList(), design.getEndpointSpecTrash()}) {
+        for (int i = 0; i < list->getCount(); ++i) {
+            Tsd_EndpointSpec* spec = list->getAt(i) ? list->getAt(i)->getEndpointSpec() : nullptr;
+            if (spec == nullptr || !spec->hasDelayValue()) {
+                out.push_back(spec && spec->getLinkedSpec() ? spec->getLinkedSpec()->getTSid()
+                                                            : "-");
+                continue;
+            }
+            Tsd_TimeValue value = spec->getDelayValue();
+            std::uint64_t bits;
+            std::memcpy(&bits, &value.value, sizeof bits);
+            out.push_back(std::to_string(bits) + " " + std::to_string(value.units));
+        }
+    }
+    return out;
+}
+
+} // namespace
+
+TEST(Trim, UserGroupCascadeMatchesRepeatedPasses) {
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        RecordingDesign fast, literal;
+        fillGroups(seed, fast);
+        fillGroups(seed, literal);
+        EXPECT_EQ(fast.trim(), literalGroupTrim(literal));
+        ASSERT_EQ(reported(fast), reported(literal));
+        ASSERT_EQ(dumpText(fast), dumpText(literal));
+    }
+}
+
+TEST(Trim, FreezingLinksMatchesWalkingEachChain) {
+    MessageManager::setDebugTrace(true);
+    for (unsigned seed = 0; seed < 1500; ++seed) {
+        SCOPED_TRACE(seed);
+        RecordingDesign fast, literal;
+        fillSpecs(seed, fast);
+        fillSpecs(seed, literal);
+        std::string fastText, literalText;
+        {
+            MessageCapture capture;
+            fastText = fatalText([&] { fast.trim(); }) + capture.sink.transcript();
+        }
+        {
+            MessageCapture capture;
+            literalText = fatalText([&] { literalFreeze(literal); }) + capture.sink.transcript();
+        }
+        ASSERT_EQ(fastText, literalText);
+        ASSERT_EQ(delays(fast), delays(literal));
+        ASSERT_EQ(dumpText(fast), dumpText(literal));
+    }
+    MessageManager::setDebugTrace(false);
 }

@@ -1,6 +1,6 @@
 // Parser subclasses that write every callback as one line of text, so a
-// test compares a whole decoded constraint with one string. Also used by the
-// fuzz targets.
+// test compares a whole decoded constraint (or its error) with one string.
+// Also used by the fuzz targets.
 #pragma once
 
 #include "tsd/host/LogicalConstraintParser.h"
@@ -58,6 +58,18 @@ struct RecordedError {
     std::string token;
 };
 
+// A parse that did not end in exactly one call: its one error, or what
+// happened instead.
+inline std::string summary(bool failed, const std::vector<std::string>& calls,
+                           const std::vector<RecordedError>& errors, bool withColumn) {
+    if (failed && calls.empty() && errors.size() == 1)
+        return std::string("error: ") + constraintErrorText(errors[0].code) +
+               (withColumn ? " at " + std::to_string(errors[0].column) : "") + " '" +
+               errors[0].token + "'";
+    return "<" + std::to_string(calls.size()) + " calls, " + std::to_string(errors.size()) +
+           " errors" + (failed ? ", failed>" : ">");
+}
+
 class RecordingLogicalParser : public LogicalConstraintParser {
 public:
     std::vector<std::string> calls;
@@ -70,12 +82,16 @@ public:
         errors.clear();
         handles.clear();
     }
-    // The one call of the last parse, or a description of what happened.
-    std::string only() const {
-        if (calls.size() == 1 && errors.empty())
-            return calls[0];
-        return "<" + std::to_string(calls.size()) + " calls, " + std::to_string(errors.size()) +
-               " errors>";
+    // What one parse of `text` gives: its one call with the place the handle
+    // gives, or its one error.
+    std::string result(const char* text) {
+        static const char* const kinds[] = {"timegrp", "timespec", "offset", "enable", "disable"};
+        clear();
+        const bool failed = parse(text);
+        if (!failed && calls.size() == 1 && errors.empty())
+            return calls[0] + " @" + kinds[handles[0].kind()] + ":" +
+                   std::to_string(handles[0].column()) + "+" + std::to_string(handles[0].length());
+        return summary(failed, calls, errors, true);
     }
 
     bool cb_error(int code, int column, const char* token) override {
@@ -175,11 +191,12 @@ public:
         calls.clear();
         errors.clear();
     }
-    std::string only() const {
-        if (calls.size() == 1 && errors.empty())
+    std::string result(const char* text) {
+        clear();
+        const bool failed = parse(text);
+        if (!failed && calls.size() == 1 && errors.empty())
             return calls[0];
-        return "<" + std::to_string(calls.size()) + " calls, " + std::to_string(errors.size()) +
-               " errors>";
+        return summary(failed, calls, errors, false);
     }
 
     bool cb_error(int code, const char* token) override {

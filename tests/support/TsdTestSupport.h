@@ -1,14 +1,19 @@
 // Helpers shared by the tests: a sink that captures every message (and turns
-// a fatal message into an exception, so fatal paths stay in the process), a
-// reference record and a reference holder for tests of the foundation, and
-// dump capture.
+// a fatal message into an exception, so fatal paths stay in the process),
+// reference records and holders, a design that records what trim reports,
+// object texts (property and dump), and golden files.
 #pragma once
 
 #include "tsd/Tsd.h"
 
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <fstream>
 #include <sstream>
 #include <stdexcept>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace tsd_test {
@@ -42,11 +47,8 @@ public:
     // Every message as "severity: text", in order: one string to compare.
     std::string transcript() const {
         std::string out;
-        for (const MessageRecord& r : records) {
-            out += messageSeverityName(r.severity);
-            out += ": ";
-            out += r.text;
-        }
+        for (const MessageRecord& r : records)
+            out += std::string(messageSeverityName(r.severity)) + ": " + r.text;
         return out;
     }
 
@@ -65,7 +67,7 @@ private:
     ScopedMessageSink m_guard;
 };
 
-// The text of one fatal message raised by `body`; fails the test otherwise.
+// The text of one fatal message raised by `body`, with its code when asked.
 template <class F>
 std::string fatalText(F&& body, int* code = nullptr) {
     try {
@@ -93,7 +95,7 @@ public:
     }
     const std::string& name() const { return m_name; }
 
-    // Expose the protected helpers of Tsd_Ref for tests.
+    // The protected helpers of Tsd_Ref.
     NamedRef* duplicate() const {
         auto* copy = new NamedRef(*this);
         copyTo(copy);
@@ -109,6 +111,40 @@ private:
     int* m_destroyed;
 };
 
+// Gives `holder` a fresh reference record and returns it.
+inline NamedRef* attachRef(Tsd_BaseObj* holder, const std::string& element = "elem",
+                           int* destroyed = nullptr) {
+    auto* ref = new NamedRef(element, destroyed);
+    ref->setOwner(holder);
+    return ref;
+}
+
+// A design that records what trim() reports.
+class RecordingDesign : public Tsd_Design {
+public:
+    using Tsd_Design::Tsd_Design;
+
+    std::vector<std::pair<Tsd_BaseObj*, TrimReason>> trashed;
+
+protected:
+    void reportObjTrashed(Tsd_BaseObj* obj, TrimReason reason) override {
+        trashed.emplace_back(obj, reason);
+    }
+};
+
+inline Tsd_TimeValue ns(double value) {
+    return Tsd_TimeValue(value, Tsd_TimeValue::UNITS_NS);
+}
+
+// What a walk of a list yields, in order.
+inline std::vector<Tsd_BaseObj*> objects(const Tsd_BaseObjList* list) {
+    std::vector<Tsd_BaseObj*> out;
+    Tsd_BaseObjListIter iter(list);
+    while (Tsd_BaseObj* obj = iter.next())
+        out.push_back(obj);
+    return out;
+}
+
 template <class Obj>
 std::string dumpText(const Obj& obj, short indent = 0) {
     std::ostringstream out;
@@ -117,24 +153,91 @@ std::string dumpText(const Obj& obj, short indent = 0) {
     return out.str();
 }
 
-// An object's property as two copied strings; "<no property>" as the name
-// when getProp returns false.
-struct Prop {
-    std::string name;
-    std::string value;
-    bool operator==(const Prop& other) const { return name == other.name && value == other.value; }
-};
-
-inline Prop propOf(const Tsd_BaseObj& obj) {
-    const char* name = nullptr;
-    const char* value = nullptr;
-    if (!obj.getProp(name, value))
-        return {"<no property>", ""};
-    return {name != nullptr ? name : "<null>", value != nullptr ? value : "<null>"};
+// "NAME = VALUE" of an object's property, "<no property>", or the fatal
+// message that asking for it raised.
+inline std::string propText(const Tsd_BaseObj& obj) {
+    MessageCapture capture;
+    std::string text = "<no property>";
+    std::string fatal = fatalText([&] {
+        const char* name = nullptr;
+        const char* value = nullptr;
+        if (obj.getProp(name, value))
+            text = std::string(name != nullptr ? name : "<null>") + " = " +
+                   (value != nullptr ? value : "<null>");
+    });
+    return fatal != "<no fatal message>" ? "fatal: " + fatal : text;
 }
 
-inline std::ostream& operator<<(std::ostream& out, const Prop& prop) {
-    return out << prop.name << " = " << prop.value;
+// The property, then the dump: what a golden file of objects shows.
+inline std::string describe(const Tsd_BaseObj& obj) {
+    return propText(obj) + "\n" + dumpText(obj, 1);
+}
+
+inline std::string readFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::ostringstream text;
+    text << in.rdbuf();
+    return text.str();
+}
+
+// Compares `actual` with the golden file `name` (under tests/); with
+// TSD_UPDATE_GOLDEN set in the environment, rewrites the file instead.
+inline void expectGolden(const std::string& name, const std::string& actual) {
+    const std::string path = std::string(TSD_TEST_SOURCE_DIR) + "/" + name;
+    if (std::getenv("TSD_UPDATE_GOLDEN") != nullptr) {
+        std::ofstream(path, std::ios::binary) << actual;
+        return;
+    }
+    EXPECT_EQ(actual, readFile(path)) << "golden file " << name;
+}
+
+// Control characters and backslashes of a case written as \xNN and \\.
+inline std::string escape(const std::string& text) {
+    static const char digits[] = "0123456789abcdef";
+    std::string out;
+    for (char c : text) {
+        const auto u = static_cast<unsigned char>(c);
+        if (c == '\\')
+            out += "\\\\";
+        else if (u < 0x20 || u == 0x7f)
+            out += std::string("\\x") + digits[u >> 4] + digits[u & 15];
+        else
+            out += c;
+    }
+    return out;
+}
+
+inline std::string unescape(const std::string& text) {
+    std::string out;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (text[i] == '\\' && i + 1 < text.size() && text[i + 1] == '\\') {
+            out += '\\';
+            ++i;
+        } else if (text[i] == '\\' && text[i + 1] == 'x' && i + 3 < text.size()) {
+            out += static_cast<char>(std::stoi(text.substr(i + 2, 2), nullptr, 16));
+            i += 3;
+        } else {
+            out += text[i];
+        }
+    }
+    return out;
+}
+
+// A cases file under tests/: one input per line, each followed by a line
+// "  => " and what `result` gives for it; '#' lines and blank lines stand
+// as they are. The expectations are compared as a golden file.
+template <class F>
+void expectCases(const std::string& name, F&& result) {
+    std::istringstream in(readFile(std::string(TSD_TEST_SOURCE_DIR) + "/" + name));
+    std::string out, line;
+    while (std::getline(in, line)) {
+        if (line.rfind("  => ", 0) == 0)
+            continue;
+        out += line + "\n";
+        if (!line.empty() && line[0] != '#')
+            out += "  => " + escape(result(unescape(line))) + "\n";
+    }
+    expectGolden(name, out);
 }
 
 } // namespace tsd_test

@@ -2,7 +2,7 @@
 // the walks and passes they replace.
 #pragma once
 
-#include "DesignTestSupport.h"
+#include "TsdTestSupport.h"
 
 #include <algorithm>
 #include <random>
