@@ -242,10 +242,10 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
             .member("warnings", warnings)
             .member("groups", groups)
             .member("specs", specs)
-            .member("references", refs)
-            .endObject()
-            .endObject()
-            .finish();
+            .member("references", refs);
+        if (session.assumeNetlist())
+            json.member("assumed", session.assumedCount());
+        json.endObject().endObject().finish();
         emit(options, out);
     } else {
         printDiagnostics(session);
@@ -253,11 +253,15 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
             session.fileNames().size() == 1
                 ? session.fileNames().front()
                 : plural(static_cast<int>(session.fileNames().size()), "file", "files");
-        emit(options, what + ": " + plural(errors, "error", "errors") + ", " +
-                          plural(warnings, "warning", "warnings") + "; " +
-                          plural(groups, "group", "groups") + ", " +
-                          plural(specs, "spec", "specs") + ", " +
-                          plural(refs, "reference", "references") + "\n");
+        emit(options,
+             what + ": " + plural(errors, "error", "errors") + ", " +
+                 plural(warnings, "warning", "warnings") + "; " +
+                 plural(groups, "group", "groups") + ", " + plural(specs, "spec", "specs") + ", " +
+                 plural(refs, "reference", "references") +
+                 (session.assumeNetlist() ? "; " + plural(session.assumedCount(), "name", "names") +
+                                                " taken from the netlist"
+                                          : std::string()) +
+                 "\n");
     }
     return errors == 0 ? kExitOk : kExitErrors;
 }
