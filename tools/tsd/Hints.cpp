@@ -118,9 +118,10 @@ std::string didYouMean(std::string_view name, const std::vector<std::string>& de
     return hintText(closestName(name, defined));
 }
 
-NameHints::NameHints(std::vector<std::string> defined)
+NameHints::NameHints(std::vector<std::string> defined, std::size_t budget)
     : m_defined(std::move(defined)),
-      m_budget(std::max<std::size_t>(std::size_t{1} << 20, 4 * m_defined.size())) {
+      m_budget(budget != 0 ? budget
+                           : std::max<std::size_t>(std::size_t{1} << 20, 4 * m_defined.size())) {
     for (std::uint32_t i = 0; i < m_defined.size(); ++i) {
         m_byLower.emplace(lowerCase(m_defined[i]), i);
         m_byLength[m_defined[i].size()].push_back(i);

@@ -35,7 +35,8 @@ std::string didYouMean(std::string_view name, const std::vector<std::string>& de
 // a few passes over the names, not one pass each.
 class NameHints {
 public:
-    explicit NameHints(std::vector<std::string> defined);
+    // `budget` 0: a few comparisons per name, at least a million.
+    explicit NameHints(std::vector<std::string> defined, std::size_t budget = 0);
 
     std::optional<std::string> closest(std::string_view name);
     std::string didYouMean(std::string_view name);
