@@ -310,11 +310,14 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
         return kExitErrors;
     Tsd_Group* found = findAnyGroup(session.design(), group);
     if (found == nullptr) {
-        session.addDiagnostic({session.displayFile(),
-                               0,
-                               Severity::Error,
-                               "no group, clock group or TIG directive named " + inQuotes(group),
-                               {}});
+        Diagnostic missing{session.displayFile(),
+                           0,
+                           Severity::Error,
+                           "no group, clock group or TIG directive named " + inQuotes(group),
+                           {}};
+        if (std::string hint = session.groupHint(group); !hint.empty())
+            missing.details.push_back("   " + hint);
+        session.addDiagnostic(std::move(missing));
         if (options.json) {
             std::string out;
             JsonWriter json(out);

@@ -5,8 +5,6 @@
 
 #include "tsd/host/DumpStream.h"
 
-#include <optional>
-
 namespace tsd_cli {
 
 namespace {
@@ -420,7 +418,6 @@ std::vector<std::string> NetlistStandIn::namesOf(NameKind kind) {
 }
 
 void NetlistStandIn::explainMissingNames(std::vector<Diagnostic>& diags) {
-    std::optional<NameHints> hints[3]; // by NameKind, made on first need
     // Only a file without the netlist's reference records is worth checking
     // as if the netlist were there.
     bool optionTold = m_assume || m_session.store().fileCount() == m_session.m_propFilesRead;
@@ -430,18 +427,27 @@ void NetlistStandIn::explainMissingNames(std::vector<Diagnostic>& diags) {
         bool missing = diag.severity == Severity::Error && missingName(diag.text, kind, name);
         if (!missing && !(diag.severity == Severity::Note && takenName(diag.text, kind, name)))
             continue;
-        std::optional<NameHints>& known = hints[static_cast<int>(kind)];
-        if (!known)
-            known.emplace(namesOf(kind));
-        std::string hint = known->didYouMean(name);
-        if (!hint.empty())
-            diag.details.push_back("   " + hint);
+        std::string close = hint({kind}, name);
+        if (!close.empty())
+            diag.details.push_back("   " + close);
         if (missing && !optionTold) {
             diag.details.emplace_back("   (with --assume-netlist, names that the files use but "
                                       "never define are taken as defined by the netlist)");
             optionTold = true;
         }
     }
+}
+
+std::string NetlistStandIn::hint(std::initializer_list<NameKind> kinds, std::string_view name) {
+    for (NameKind kind : kinds) {
+        std::unique_ptr<NameHints>& hints = m_hints[static_cast<int>(kind)];
+        if (!hints)
+            hints = std::make_unique<NameHints>(namesOf(kind));
+        std::string close = hints->didYouMean(name);
+        if (!close.empty())
+            return close;
+    }
+    return std::string();
 }
 
 } // namespace tsd_cli

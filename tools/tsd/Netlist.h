@@ -12,11 +12,13 @@
 #pragma once
 
 #include "Diagnostics.h"
+#include "Hints.h"
 
 #include "tsd/Tsd.h"
 
 #include <cstddef>
 #include <cstdint>
+#include <initializer_list>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -108,6 +110,9 @@ public:
     // that --assume-netlist exists. Call after the diagnostics are in their
     // order.
     void explainMissingNames(std::vector<Diagnostic>& diags);
+    // `did you mean "NAME"?` for the defined name of one of `kinds` closest
+    // to `name`, or empty.
+    std::string hint(std::initializer_list<NameKind> kinds, std::string_view name);
 
 private:
     bool isDefinedByGroupRecord(const std::string& name);
@@ -129,6 +134,7 @@ private:
     std::vector<std::pair<std::string, std::ptrdiff_t>> m_intakeRegGroups;
     std::unordered_map<std::string, std::ptrdiff_t> m_intakeClocks;
     std::vector<std::pair<SuppliedSpec*, std::size_t>> m_tsids; // and the record naming it
+    std::unique_ptr<NameHints> m_hints[3];                      // by NameKind, made on first need
 };
 
 } // namespace tsd_cli

@@ -147,6 +147,11 @@ public:
     bool assumeNetlist() const { return m_standIn.assume(); }
     // How many names were taken as defined by the netlist.
     int assumedCount() const { return m_standIn.assumedCount(); }
+    // `did you mean "NAME"?` for the group or clock net closest to `name`,
+    // or empty.
+    std::string groupHint(std::string_view name) {
+        return m_standIn.hint({NameKind::Group, NameKind::ClockNet}, name);
+    }
 
     // Builds the design; true when it was built and no error was reported.
     bool build();
