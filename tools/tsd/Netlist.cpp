@@ -216,28 +216,27 @@ void NetlistStandIn::takeFromNetlist(NameKind kind, const char* name, std::ptrdi
     m_session.addNote("\"" + std::string(name) + takenTail(kind), record);
 }
 
+SuppliedGroup* NetlistStandIn::supplyGroup(const char* name, std::ptrdiff_t record) {
+    bool predefined = isPredefinedName(name);
+    if ((!predefined && !m_assume) || isDefinedByGroupRecord(name))
+        return nullptr; // a definition may come later
+    Origin origin = predefined ? Origin::Architecture : Origin::Netlist;
+    if (!predefined)
+        takeFromNetlist(NameKind::Group, name, record);
+    auto* group = new SuppliedGroup(name, origin);
+    m_session.design().addGroup(group);
+    supply(group, origin);
+    return group;
+}
+
 Tsd_PredefGroup* NetlistStandIn::termGroup(const char* name) {
     // Asked while the stored groups and specs are processed: every
     // reference is in, so a TNM group of the name has won already.
     if (name == nullptr || !m_session.m_building || (!m_assume && !mayBePredefined(name)))
         return nullptr;
-    Tsd_Design& design = m_session.design();
-    if (design.findGroupByUserName(name, false) != nullptr)
+    if (m_session.design().findGroupByUserName(name, false) != nullptr)
         return nullptr;
-    std::string key(name);
-    if (isDefinedByGroupRecord(key))
-        return nullptr; // its definition may come later
-    Origin origin = Origin::Architecture;
-    if (!isPredefinedName(name)) {
-        if (!m_assume)
-            return nullptr;
-        origin = Origin::Netlist;
-        takeFromNetlist(NameKind::Group, name, -1);
-    }
-    auto* group = new SuppliedGroup(name, origin);
-    design.addGroup(group);
-    supply(group, origin);
-    return group;
+    return supplyGroup(name, -1);
 }
 
 Tsd_ThruGroup* NetlistStandIn::thruGroup(const char* name) {
@@ -296,21 +295,9 @@ void NetlistStandIn::beforeBuild() {
     }
     m_intakeClocks.clear();
     // Register groups of net offsets: the build looks them up by name.
-    for (const auto& [name, record] : m_intakeRegGroups) {
-        if (design.findGroupByUserName(name.c_str(), false) != nullptr ||
-            isDefinedByGroupRecord(name))
-            continue;
-        Origin origin = Origin::Architecture;
-        if (!isPredefinedName(name.c_str())) {
-            if (!m_assume)
-                continue;
-            origin = Origin::Netlist;
-            takeFromNetlist(NameKind::Group, name.c_str(), record);
-        }
-        auto* group = new SuppliedGroup(name.c_str(), origin);
-        design.addGroup(group);
-        supply(group, origin);
-    }
+    for (const auto& [name, record] : m_intakeRegGroups)
+        if (design.findGroupByUserName(name.c_str(), false) == nullptr)
+            supplyGroup(name.c_str(), record);
     m_intakeRegGroups.clear();
     if (m_assume)
         supplyTSids();

@@ -116,6 +116,10 @@ public:
 
 private:
     bool isDefinedByGroupRecord(const std::string& name);
+    // A group for a name that the design lacks: the architecture's for a
+    // predefined name, else the netlist's when names are assumed; null
+    // when neither, or when a group record defines the name.
+    SuppliedGroup* supplyGroup(const char* name, std::ptrdiff_t record);
     void supply(Tsd_BaseObj* obj, Origin origin);
     void takeFromNetlist(NameKind kind, const char* name, std::ptrdiff_t record);
     void supplyTSids();
