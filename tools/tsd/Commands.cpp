@@ -119,10 +119,18 @@ void forEachCanonicalProp(Session& session, Visit visit) {
     }
 }
 
+// A property line of the design's; a reference value is a name.
+void appendDesignLine(std::string& out, std::string& scratch, PropKind kind,
+                      std::string_view element, std::string_view name, std::string_view value) {
+    appendPropLine(out, kind, element, name,
+                   kind == PropKind::Ref ? refValueText(value, scratch) : value);
+}
+
 void appendCanonicalText(std::string& out, Session& session) {
-    forEachCanonicalProp(session, [&out](PropKind kind, std::string_view element,
-                                         std::string_view name, std::string_view value) {
-        appendPropLine(out, kind, element, name, value);
+    std::string scratch;
+    forEachCanonicalProp(session, [&](PropKind kind, std::string_view element,
+                                      std::string_view name, std::string_view value) {
+        appendDesignLine(out, scratch, kind, element, name, value);
     });
 }
 
@@ -350,10 +358,12 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
         json.endObject().finish();
         emit(options, out);
     } else {
-        forEachHolderProp(
-            session, holders,
-            [&out](PropKind kind, std::string_view element, std::string_view name,
-                   std::string_view value) { appendPropLine(out, kind, element, name, value); });
+        std::string scratch;
+        forEachHolderProp(session, holders,
+                          [&](PropKind kind, std::string_view element, std::string_view name,
+                              std::string_view value) {
+                              appendDesignLine(out, scratch, kind, element, name, value);
+                          });
         emit(options, out);
         printDiagnostics(session);
     }

@@ -154,30 +154,6 @@ std::string_view trimBlanks(std::string_view text) {
     return text;
 }
 
-// A reference value that begins with a quote is one quoted name.
-LineStatus readQuotedRefValue(PropFields& prop, std::string& error) {
-    LineReader reader(prop.value);
-    Word word;
-    if (!reader.readWord(word, error))
-        return LineStatus::Malformed;
-    reader.skipBlanks();
-    if (!reader.atEnd()) {
-        error = "unexpected text after the quoted reference value " + inQuotes(word.str()) +
-                " (a reference value is one name)";
-        return LineStatus::Malformed;
-    }
-    prop.value = word.text;
-    prop.valueEscaped = word.escaped;
-    return LineStatus::Property;
-}
-
-// A reference value reads back as itself unless blanks would be trimmed
-// from it or a quote would be taken for the start of a quoted name.
-bool refValueNeedsQuotes(std::string_view value) {
-    return !value.empty() &&
-           (value.front() == '"' || isBlank(value.front()) || isBlank(value.back()));
-}
-
 } // namespace
 
 const char* propKeyword(PropKind kind) {
@@ -267,9 +243,6 @@ LineStatus parsePropLine(std::string_view text, PropFields& prop, std::string& e
     }
     reader.advance();
     prop.value = trimBlanks(reader.rest());
-    prop.valueEscaped = false;
-    if (prop.kind == PropKind::Ref && !prop.value.empty() && prop.value.front() == '"')
-        return readQuotedRefValue(prop, error);
     return LineStatus::Property;
 }
 
@@ -339,6 +312,15 @@ void appendQuotedWord(std::string& out, std::string_view word) {
     out += '"';
 }
 
+std::string_view refValueText(std::string_view value, std::string& scratch) {
+    if (value.empty() ||
+        (value.front() != '"' && !isBlank(value.front()) && !isBlank(value.back())))
+        return value;
+    scratch.clear();
+    appendQuotedWord(scratch, value);
+    return scratch;
+}
+
 std::string quoteWord(std::string_view word) {
     std::string quoted;
     appendQuotedWord(quoted, word);
@@ -357,10 +339,7 @@ void appendPropLine(std::string& out, PropKind kind, std::string_view element,
     out += " =";
     if (!value.empty()) {
         out += ' ';
-        if (kind == PropKind::Ref && refValueNeedsQuotes(value))
-            appendQuotedWord(out, value);
-        else
-            out += value;
+        out += value;
     }
     out += '\n';
 }

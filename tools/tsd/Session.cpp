@@ -1,6 +1,7 @@
 #include "Session.h"
 
 #include "Pages.h"
+#include "Statements.h"
 
 #include "tsd/host/DumpStream.h"
 
@@ -259,7 +260,17 @@ void Session::readPropFile(std::uint32_t file) {
             if (fields.kind == PropKind::Ref)
                 record.element = span(fields.element, StoredProp::Element);
             record.name = span(fields.name, StoredProp::Name);
-            record.value = span(Word{fields.value, fields.valueEscaped}, StoredProp::Value);
+            record.value = m_store.spanIn(file, fields.value);
+            // A reference value is a name: one quoted string stands for the
+            // name inside.
+            if (fields.kind == PropKind::Ref && !fields.value.empty() &&
+                fields.value.front() == '"') {
+                std::string name = refValueName(fields.value);
+                if (name.size() != fields.value.size()) {
+                    record.value = m_store.keep(name);
+                    record.inArena |= StoredProp::Value;
+                }
+            }
             add(record);
             break;
         }
