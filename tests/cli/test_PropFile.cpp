@@ -2,6 +2,7 @@
 // refused with which message, and that every name is written so that it
 // reads back as itself.
 #include "PropFile.h"
+#include "Statements.h"
 
 #include <gtest/gtest.h>
 
@@ -154,6 +155,13 @@ TEST(PropFile, EveryWrittenLineReadsBackAsItself) {
             EXPECT_EQ(parsed.value, "v = w") << line;
             EXPECT_EQ(formatPropLine(kind, parsed.element, parsed.name, parsed.value), line);
         }
+    }
+    // A reference value is written so that it reads back as the same name.
+    for (const std::string& word : words) {
+        std::string scratch;
+        Parsed parsed = parse(
+            formatPropLine(PropKind::Ref, "e", "TS_TNM", tsd_cli::refValueText(word, scratch)));
+        EXPECT_EQ(tsd_cli::refValueName(parsed.value), word) << word << ": " << parsed.error;
     }
     EXPECT_EQ(formatPropLine(PropKind::Group, "", "g", ""), "group g =");
     EXPECT_EQ(formatPropLine(PropKind::Ref, "e 1", "TS_TIG", "global"),

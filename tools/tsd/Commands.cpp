@@ -119,10 +119,18 @@ void forEachCanonicalProp(Session& session, Visit visit) {
     }
 }
 
+// A property line of the design's; a reference value is a name.
+void appendDesignLine(std::string& out, std::string& scratch, PropKind kind,
+                      std::string_view element, std::string_view name, std::string_view value) {
+    appendPropLine(out, kind, element, name,
+                   kind == PropKind::Ref ? refValueText(value, scratch) : value);
+}
+
 void appendCanonicalText(std::string& out, Session& session) {
-    forEachCanonicalProp(session, [&out](PropKind kind, std::string_view element,
-                                         std::string_view name, std::string_view value) {
-        appendPropLine(out, kind, element, name, value);
+    std::string scratch;
+    forEachCanonicalProp(session, [&](PropKind kind, std::string_view element,
+                                      std::string_view name, std::string_view value) {
+        appendDesignLine(out, scratch, kind, element, name, value);
     });
 }
 
@@ -242,10 +250,10 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
             .member("warnings", warnings)
             .member("groups", groups)
             .member("specs", specs)
-            .member("references", refs)
-            .endObject()
-            .endObject()
-            .finish();
+            .member("references", refs);
+        if (session.assumeNetlist())
+            json.member("assumed", session.assumedCount());
+        json.endObject().endObject().finish();
         emit(options, out);
     } else {
         printDiagnostics(session);
@@ -253,11 +261,15 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
             session.fileNames().size() == 1
                 ? session.fileNames().front()
                 : plural(static_cast<int>(session.fileNames().size()), "file", "files");
-        emit(options, what + ": " + plural(errors, "error", "errors") + ", " +
-                          plural(warnings, "warning", "warnings") + "; " +
-                          plural(groups, "group", "groups") + ", " +
-                          plural(specs, "spec", "specs") + ", " +
-                          plural(refs, "reference", "references") + "\n");
+        emit(options,
+             what + ": " + plural(errors, "error", "errors") + ", " +
+                 plural(warnings, "warning", "warnings") + "; " +
+                 plural(groups, "group", "groups") + ", " + plural(specs, "spec", "specs") + ", " +
+                 plural(refs, "reference", "references") +
+                 (session.assumeNetlist() ? "; " + plural(session.assumedCount(), "name", "names") +
+                                                " taken from the netlist"
+                                          : std::string()) +
+                 "\n");
     }
     return errors == 0 ? kExitOk : kExitErrors;
 }
@@ -306,11 +318,14 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
         return kExitErrors;
     Tsd_Group* found = findAnyGroup(session.design(), group);
     if (found == nullptr) {
-        session.addDiagnostic({session.displayFile(),
-                               0,
-                               Severity::Error,
-                               "no group, clock group or TIG directive named " + inQuotes(group),
-                               {}});
+        Diagnostic missing{session.displayFile(),
+                           0,
+                           Severity::Error,
+                           "no group, clock group or TIG directive named " + inQuotes(group),
+                           {}};
+        if (std::string hint = session.groupHint(group); !hint.empty())
+            missing.details.push_back("   " + hint);
+        session.addDiagnostic(std::move(missing));
         if (options.json) {
             std::string out;
             JsonWriter json(out);
@@ -343,10 +358,12 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
         json.endObject().finish();
         emit(options, out);
     } else {
-        forEachHolderProp(
-            session, holders,
-            [&out](PropKind kind, std::string_view element, std::string_view name,
-                   std::string_view value) { appendPropLine(out, kind, element, name, value); });
+        std::string scratch;
+        forEachHolderProp(session, holders,
+                          [&](PropKind kind, std::string_view element, std::string_view name,
+                              std::string_view value) {
+                              appendDesignLine(out, scratch, kind, element, name, value);
+                          });
         emit(options, out);
         printDiagnostics(session);
     }

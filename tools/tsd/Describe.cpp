@@ -1,8 +1,14 @@
 #include "Describe.h"
 
+#include "Netlist.h"
+
 namespace tsd_cli {
 
 const char* objectClass(Tsd_BaseObj* obj) {
+    if (auto* supplied = dynamic_cast<SuppliedGroup*>(obj))
+        return supplied->origin() == Origin::Architecture ? "predefined group" : "netlist group";
+    if (dynamic_cast<SuppliedSpec*>(obj) != nullptr)
+        return "netlist specification";
     if (obj->getUserGroup() != nullptr)
         return "user group";
     if (obj->getTNMGroup() != nullptr)

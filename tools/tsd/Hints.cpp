@@ -64,6 +64,22 @@ private:
     std::vector<int> m_before, m_previous, m_current;
 };
 
+std::string lowerCase(std::string_view text) {
+    std::string lower(text);
+    for (char& c : lower)
+        c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+    return lower;
+}
+
+// At most a third of the name's length, at most two; one is always allowed.
+int editBound(std::string_view name) {
+    return std::max(1, std::min(2, static_cast<int>(name.size()) / 3));
+}
+
+std::string hintText(const std::optional<std::string>& close) {
+    return close ? "did you mean " + inQuotes(*close) + "?" : std::string();
+}
+
 } // namespace
 
 bool equalsNoCase(std::string_view a, std::string_view b) {
@@ -78,7 +94,7 @@ bool equalsNoCase(std::string_view a, std::string_view b) {
 
 std::optional<std::string> closestName(std::string_view name,
                                        const std::vector<std::string>& defined) {
-    int bound = std::max(1, std::min(2, static_cast<int>(name.size()) / 3));
+    int bound = editBound(name);
     BoundedDistance distance(bound);
     const std::string* best = nullptr;
     int bestScore = bound + 1;
@@ -99,8 +115,56 @@ std::optional<std::string> closestName(std::string_view name,
 }
 
 std::string didYouMean(std::string_view name, const std::vector<std::string>& defined) {
-    std::optional<std::string> close = closestName(name, defined);
-    return close ? "did you mean " + inQuotes(*close) + "?" : std::string();
+    return hintText(closestName(name, defined));
+}
+
+NameHints::NameHints(std::vector<std::string> defined, std::size_t budget)
+    : m_defined(std::move(defined)),
+      m_budget(budget != 0 ? budget
+                           : std::max<std::size_t>(std::size_t{1} << 20, 4 * m_defined.size())) {
+    for (std::uint32_t i = 0; i < m_defined.size(); ++i) {
+        m_byLower.emplace(lowerCase(m_defined[i]), i);
+        m_byLength[m_defined[i].size()].push_back(i);
+    }
+}
+
+std::optional<std::string> NameHints::closest(std::string_view name) {
+    auto sameLetters = m_byLower.find(lowerCase(name));
+    if (sameLetters != m_byLower.end() && m_defined[sameLetters->second] != name)
+        return m_defined[sameLetters->second]; // nothing is closer
+    int bound = editBound(name);
+    BoundedDistance distance(bound);
+    int bestScore = bound + 1;
+    std::uint32_t best = 0;
+    for (std::size_t length = name.size() > static_cast<std::size_t>(bound)
+                                  ? name.size() - static_cast<std::size_t>(bound)
+                                  : 0;
+         length <= name.size() + static_cast<std::size_t>(bound); ++length) {
+        auto bucket = m_byLength.find(length);
+        if (bucket == m_byLength.end())
+            continue;
+        for (std::uint32_t index : bucket->second) {
+            if (m_budget == 0)
+                break;
+            --m_budget;
+            const std::string& candidate = m_defined[index];
+            if (candidate == name)
+                continue;
+            int score = distance(name, candidate);
+            // Among equally close names the first defined wins.
+            if (score < bestScore || (score == bestScore && score <= bound && index < best)) {
+                bestScore = score;
+                best = index;
+            }
+        }
+    }
+    if (bestScore > bound)
+        return std::nullopt;
+    return m_defined[best];
+}
+
+std::string NameHints::didYouMean(std::string_view name) {
+    return hintText(closest(name));
 }
 
 } // namespace tsd_cli

@@ -312,6 +312,15 @@ void appendQuotedWord(std::string& out, std::string_view word) {
     out += '"';
 }
 
+std::string_view refValueText(std::string_view value, std::string& scratch) {
+    if (value.empty() ||
+        (value.front() != '"' && !isBlank(value.front()) && !isBlank(value.back())))
+        return value;
+    scratch.clear();
+    appendQuotedWord(scratch, value);
+    return scratch;
+}
+
 std::string quoteWord(std::string_view word) {
     std::string quoted;
     appendQuotedWord(quoted, word);

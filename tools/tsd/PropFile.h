@@ -6,8 +6,9 @@
 //
 // Names and elements are bare words or double-quoted strings (with \" and \\);
 // the value is the rest of the line after the "=", blanks trimmed at both
-// ends. Blank lines and lines whose first non-blank character is '#' are
-// ignored.
+// ends; a reference value that is one quoted string stands for the name
+// inside (refValueName). Blank lines and lines whose first non-blank
+// character is '#' are ignored.
 //
 // Whatever the input format, what reaches the builder is a StoredProp: a
 // compact record whose texts are spans of its file's text, kept once in a
@@ -141,6 +142,11 @@ void appendQuotedWord(std::string& out, std::string_view word);
 
 // Text in double quotes, as messages show names.
 std::string inQuotes(std::string_view text);
+
+// A reference value as a property line must hold it to read back as the
+// same name: quoted (in `scratch`) when blanks would be trimmed from it or
+// its first quote would be taken for a quoted name, else the value itself.
+std::string_view refValueText(std::string_view value, std::string& scratch);
 
 // One property line, without end-of-line, that reads back as the same
 // element, name and value. The value must not have leading or trailing

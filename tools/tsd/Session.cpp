@@ -1,6 +1,7 @@
 #include "Session.h"
 
 #include "Pages.h"
+#include "Statements.h"
 
 #include "tsd/host/DumpStream.h"
 
@@ -176,7 +177,7 @@ Session::Session() {
     *slot = this;
     m_number = static_cast<std::uint32_t>(slot - live.begin());
     m_design = std::make_unique<CliDesign>();
-    m_builder = std::make_unique<CliBuilder>(m_design.get());
+    m_builder = std::make_unique<CliBuilder>(m_design.get(), &m_standIn);
 }
 
 Session::~Session() {
@@ -222,6 +223,7 @@ std::uint32_t Session::addFile(InputFile input) {
 }
 
 void Session::readPropFile(std::uint32_t file) {
+    ++m_propFilesRead;
     std::string_view text = m_store.fileText(file);
     // A byte-order mark is not part of the first line.
     std::size_t start = text.substr(0, 3) == "\xEF\xBB\xBF" ? 3 : 0;
@@ -259,6 +261,16 @@ void Session::readPropFile(std::uint32_t file) {
                 record.element = span(fields.element, StoredProp::Element);
             record.name = span(fields.name, StoredProp::Name);
             record.value = m_store.spanIn(file, fields.value);
+            // A reference value is a name: one quoted string stands for the
+            // name inside.
+            if (fields.kind == PropKind::Ref && !fields.value.empty() &&
+                fields.value.front() == '"') {
+                std::string name = refValueName(fields.value);
+                if (name.size() != fields.value.size()) {
+                    record.value = m_store.keep(name);
+                    record.inArena |= StoredProp::Value;
+                }
+            }
             add(record);
             break;
         }
@@ -334,15 +346,29 @@ void Session::feed(std::size_t index) {
     }
 }
 
-void Session::addDesignNet(std::string_view net) {
-    m_designNets.emplace_back(net);
+void Session::addNote(std::string text, std::ptrdiff_t record) {
+    if (record < 0 && m_building) {
+        m_buildMessages.push_back({MessageSeverity::Status, std::move(text), m_builder->context()});
+        return;
+    }
+    Diagnostic diag{m_displayFile, 0, Severity::Note, std::move(text), {}};
+    if (record >= 0) {
+        const StoredProp& prop = m_store[static_cast<std::size_t>(record)];
+        diag.file = m_store.fileName(prop);
+        diag.line = static_cast<int>(prop.line);
+        diag.column = static_cast<int>(prop.column);
+    }
+    m_diags.push_back(std::move(diag));
 }
 
 bool Session::build() {
+    m_standIn.beforeBuild();
     m_building = true;
     Tsd_Design* result = m_builder->buildTSDesign();
     m_building = false;
+    m_standIn.afterBuild();
     attributeBuildMessages();
+    m_standIn.explainMissingNames(m_diags);
     m_built = result != nullptr;
     if (!m_built && errorCount() == 0)
         m_diags.push_back({m_displayFile, 0, Severity::Error, "the design could not be built", {}});

@@ -20,6 +20,7 @@
 #pragma once
 
 #include "Diagnostics.h"
+#include "Netlist.h"
 #include "PropFile.h"
 
 #include "tsd/Tsd.h"
@@ -83,11 +84,25 @@ protected:
 };
 
 // A builder that fills the session's design, so the design outlives a failed
-// build, and shows the context it processes a stored property under.
+// build, shows the context it processes a stored property under, and asks
+// the session's stand-in for the netlist before its own lookups.
 class CliBuilder : public Tsd_Builder {
 public:
-    explicit CliBuilder(Tsd_Design* design) : Tsd_Builder(false) { initBaseBuilder(design); }
+    CliBuilder(Tsd_Design* design, NetlistStandIn* standIn)
+        : Tsd_Builder(false), m_standIn(standIn) {
+        initBaseBuilder(design);
+    }
     std::string context() const { return utf16ToUtf8(getContext()); }
+
+protected:
+    Tsd_TermGroup* getTermGroupForSpec(const char* name) override;
+    Tsd_PredefGroup* getPredefGroupForGroup(const char* name) override;
+    Tsd_ThruGroup* getThruGroupForSpec(const char* name) override;
+    Tsd_ClkGroup* getClkGroupForSpec(const char* netName) override;
+    Tsd_TermGroup* getTermGroupForNetOffset(const char* name) override;
+
+private:
+    NetlistStandIn* m_standIn;
 };
 
 // "-" names standard input.
@@ -124,12 +139,19 @@ public:
     // an OFFSET or FEEDBACK that uses it as its clock gets its clock group
     // from the session, as a toolchain program gets it from its netlist.
     // Call before build().
-    void addDesignNet(std::string_view net);
+    void addDesignNet(std::string_view net) { m_standIn.addDesignNet(net); }
     // Group names, clock nets and TSids that the input uses but never
     // defines are taken as defined by the netlist (a note each) instead of
     // being errors. Call before build().
-    void setAssumeNetlist(bool assume) { m_assumeNetlist = assume; }
-    bool assumeNetlist() const { return m_assumeNetlist; }
+    void setAssumeNetlist(bool assume) { m_standIn.setAssume(assume); }
+    bool assumeNetlist() const { return m_standIn.assume(); }
+    // How many names were taken as defined by the netlist.
+    int assumedCount() const { return m_standIn.assumedCount(); }
+    // `did you mean "NAME"?` for the group or clock net closest to `name`,
+    // or empty.
+    std::string groupHint(std::string_view name) {
+        return m_standIn.hint({NameKind::Group, NameKind::ClockNet}, name);
+    }
 
     // Builds the design; true when it was built and no error was reported.
     bool build();
@@ -168,6 +190,11 @@ public:
 
 private:
     friend class CliRef;
+    friend class NetlistStandIn;
+
+    // A note at `record`'s line, or, with -1 during the build, at the line
+    // of the property the builder processes.
+    void addNote(std::string text, std::ptrdiff_t record);
 
     void readPropFile(std::uint32_t file);
     void feed(std::size_t index);
@@ -180,6 +207,9 @@ private:
     // Parallel to the records; cleared by a CliRef that dies.
     std::vector<CliRef*> m_refOf;
     std::size_t m_textSize = 0;
+    // Property files carry the netlist's reference records; files of other
+    // forms may come without them.
+    std::uint32_t m_propFilesRead = 0;
     std::vector<Diagnostic> m_diags;
     std::vector<RawMessage> m_buildMessages;
     std::string m_displayFile;
@@ -190,8 +220,7 @@ private:
     std::string m_name;
     std::string m_value;
     std::string m_lastRefProp; // the last name taken as a reference property
-    std::vector<std::string> m_designNets;
-    bool m_assumeNetlist = false;
+    NetlistStandIn m_standIn{*this};
     bool m_building = false;
     bool m_built = false;
     bool m_closing = false; // the design is being destroyed with the session
