@@ -62,16 +62,21 @@ endfunction()
 
 # Runs the tool and checks that what it writes as properties reads back as
 # itself: `tsd fmt` of the output gives the same lines again (comment lines
-# aside) and the output checks without errors. A run that fails must write
+# aside; with STATEMENTS, a statement file keeps its comments: the same
+# bytes) and the output checks without errors. A run that fails must write
 # nothing.
 function(tsd_golden_fixpoint)
-  cmake_parse_arguments(F "" "TOOL;DIR;OUTDIR;NAME" "ARGS" ${ARGN})
+  cmake_parse_arguments(F "STATEMENTS" "TOOL;DIR;OUTDIR;NAME" "ARGS" ${ARGN})
   unset(ENV{TSD_DEBUG_TRACE})
   unset(ENV{QOR_TSD_NO_SPECIAL_PARSER})
   unset(ENV{QOR_TSD_DEBUG_SPECIAL_PARSER})
   file(MAKE_DIRECTORY ${F_OUTDIR})
-  set(first ${F_OUTDIR}/${F_NAME}.first.props)
-  set(second ${F_OUTDIR}/${F_NAME}.second.props)
+  set(ext props)
+  if(F_STATEMENTS)
+    set(ext stmts)
+  endif()
+  set(first ${F_OUTDIR}/${F_NAME}.first.${ext})
+  set(second ${F_OUTDIR}/${F_NAME}.second.${ext})
   file(REMOVE ${first} ${second})
 
   execute_process(COMMAND ${F_TOOL} ${F_ARGS} WORKING_DIRECTORY ${F_DIR} OUTPUT_FILE ${first}
@@ -93,8 +98,11 @@ function(tsd_golden_fixpoint)
     message(FATAL_ERROR "fmt of the output failed (${status}):\n${err}")
   endif()
   file(READ ${second} twice)
-  string(REGEX REPLACE "(^|\n)#[^\n]*" "" expected "${once}")
-  string(REGEX REPLACE "^\n+" "" expected "${expected}")
+  set(expected "${once}")
+  if(NOT F_STATEMENTS)
+    string(REGEX REPLACE "(^|\n)#[^\n]*" "" expected "${once}")
+    string(REGEX REPLACE "^\n+" "" expected "${expected}")
+  endif()
   if(NOT expected STREQUAL twice)
     message(FATAL_ERROR "the output does not read back as itself:\n--- output\n${once}"
                         "--- fmt of it\n${twice}")
@@ -105,4 +113,34 @@ function(tsd_golden_fixpoint)
   if(NOT status EQUAL 0 OR NOT err STREQUAL "")
     message(FATAL_ERROR "the output does not check cleanly (${status}):\n${err}")
   endif()
+endfunction()
+
+# Converts a file both ways: its canonical property lines, written as
+# statements (or written back as the statement file it is) and read again,
+# are the same lines; and so are those lines written as statements and read
+# again.
+function(tsd_golden_conversion)
+  cmake_parse_arguments(C "" "TOOL;DIR;OUTDIR;NAME;INPUT" "" ${ARGN})
+  file(MAKE_DIRECTORY ${C_OUTDIR})
+  set(base ${C_OUTDIR}/${C_NAME})
+  function(_tsd_convert to input output)
+    execute_process(COMMAND ${C_TOOL} fmt --to ${to} ${input} -o ${output}
+                    WORKING_DIRECTORY ${C_DIR} ERROR_VARIABLE err RESULT_VARIABLE status)
+    if(NOT status EQUAL 0 OR NOT err STREQUAL "")
+      message(FATAL_ERROR "fmt --to ${to} ${input} failed (${status}):\n${err}")
+    endif()
+  endfunction()
+  _tsd_convert(props ${C_INPUT} ${base}.props)
+  _tsd_convert(statements ${C_INPUT} ${base}.stmts)
+  _tsd_convert(props ${base}.stmts ${base}.back.props)
+  _tsd_convert(statements ${base}.props ${base}.converted.stmts)
+  _tsd_convert(props ${base}.converted.stmts ${base}.converted.props)
+  file(READ ${base}.props lines)
+  foreach(form back converted)
+    file(READ ${base}.${form}.props again)
+    if(NOT again STREQUAL lines)
+      message(FATAL_ERROR "${base}.${form}.props differs from the canonical lines:\n"
+                          "--- canonical\n${lines}--- read back\n${again}")
+    endif()
+  endforeach()
 endfunction()

@@ -18,6 +18,7 @@
 #include <iostream>
 #include <limits>
 #include <sstream>
+#include <tuple>
 #include <unordered_map>
 #include <unordered_set>
 
@@ -44,6 +45,8 @@ void writeDiagnostics(JsonWriter& json, const Session& session) {
             json.number(diag.line);
         else
             json.null();
+        if (diag.column > 0) // only where it is known: never for property files
+            json.member("column", diag.column);
         json.member("severity", severityName(diag.severity))
             .member("text", diag.text)
             .key("details")
@@ -250,7 +253,6 @@ std::size_t offsetInValue(const std::string& text, const std::string& context,
 void Inputs::placeMessages(Session& session) const {
     const PropStore& store = session.store();
     std::vector<Diagnostic>& diags = session.diagnostics();
-    bool moved = false;
     for (const StatementInput& input : m_files) {
         const std::string& name = store.fileName(input.file);
         // Records by the position a message about them carries.
@@ -279,22 +281,20 @@ void Inputs::placeMessages(Session& session) const {
             if (offset == std::string_view::npos || offset >= record.prop.value.size())
                 continue;
             TextPos at = valuePosition(store.fileText(input.file), record, offset);
-            moved = moved || at.line != diag.line;
             diag.line = at.line;
             diag.column = at.column;
         }
     }
-    if (!moved)
-        return;
     // People read a file from the top: a message that moved to a later line
-    // of its statement moves among the others.
+    // of its statement moves among the others; on one line, by column.
     std::unordered_map<std::string_view, std::size_t> fileOrder;
     for (std::size_t i = 0; i < session.fileNames().size(); ++i)
         fileOrder.emplace(session.fileNames()[i], i);
     auto rank = [&](const Diagnostic& diag) {
         auto file = fileOrder.find(diag.file);
-        return std::make_pair(file != fileOrder.end() ? file->second : fileOrder.size() + 1,
-                              diag.line > 0 ? diag.line : std::numeric_limits<int>::max());
+        return std::make_tuple(file != fileOrder.end() ? file->second : fileOrder.size() + 1,
+                               diag.line > 0 ? diag.line : std::numeric_limits<int>::max(),
+                               diag.column);
     };
     std::stable_sort(diags.begin(), diags.end(),
                      [&](const Diagnostic& a, const Diagnostic& b) { return rank(a) < rank(b); });
