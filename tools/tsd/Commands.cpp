@@ -741,6 +741,15 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         json.endObject().finish();
         emit(options, out);
     } else {
+        const StatementInput* statements = inputs.statements(0);
+        // A statement file's comments end their lines as its lines do.
+        std::string_view eol = "\n";
+        if (statements != nullptr) {
+            std::string_view text = session.store().fileText(statements->file);
+            std::size_t newline = text.find('\n');
+            if (newline != std::string_view::npos && newline > 0 && text[newline - 1] == '\r')
+                eol = "\r\n";
+        }
         for (const Trashed& entry : trashed) {
             out += "# trashed ";
             out += entry.cls;
@@ -748,9 +757,9 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
             out += inQuotes(entry.name);
             out += ": ";
             out += entry.why.explanation;
-            out += '\n';
+            out += eol;
         }
-        if (const StatementInput* statements = inputs.statements(0))
+        if (statements != nullptr)
             appendStatementText(out, session, *statements, objects, trashedObjects);
         else
             appendCanonicalText(out, session);
