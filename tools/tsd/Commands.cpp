@@ -742,13 +742,18 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         emit(options, out);
     } else {
         const StatementInput* statements = inputs.statements(0);
-        // A statement file's comments end their lines as its lines do.
+        // A statement file's comments end their lines as its lines do, and
+        // come after its byte-order mark.
         std::string_view eol = "\n";
+        std::string_view bom;
         if (statements != nullptr) {
             std::string_view text = session.store().fileText(statements->file);
             std::size_t newline = text.find('\n');
             if (newline != std::string_view::npos && newline > 0 && text[newline - 1] == '\r')
                 eol = "\r\n";
+            if (text.substr(0, 3) == "\xEF\xBB\xBF")
+                bom = text.substr(0, 3);
+            out += bom;
         }
         for (const Trashed& entry : trashed) {
             out += "# trashed ";
@@ -759,10 +764,14 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
             out += entry.why.explanation;
             out += eol;
         }
-        if (statements != nullptr)
+        if (statements != nullptr) {
+            std::size_t start = out.size();
             appendStatementText(out, session, *statements, objects, trashedObjects);
-        else
+            if (!bom.empty() && out.compare(start, bom.size(), bom) == 0)
+                out.erase(start, bom.size());
+        } else {
             appendCanonicalText(out, session);
+        }
         emit(options, out);
         printDiagnostics(session);
     }
