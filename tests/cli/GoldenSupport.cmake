@@ -22,6 +22,7 @@ function(tsd_golden_run var)
   file(READ ${R_OUTDIR}/${R_NAME}.stderr err)
   set(text "status ${status}\n")
   tsd_golden_section(text "stdout" "${out}")
+  tsd_golden_carriage_returns(text ${R_OUTDIR}/${R_NAME}.stdout)
   tsd_golden_section(text "stderr" "${err}")
   set(${var} "${text}" PARENT_SCOPE)
 endfunction()
@@ -34,6 +35,21 @@ function(tsd_golden_section var title body)
     string(APPEND text "\n--- (no end-of-line above)\n")
   endif()
   set(${var} "${text}" PARENT_SCOPE)
+endfunction()
+
+# file(READ) drops carriage returns: a file that holds some has their count
+# appended to the transcript in `var`.
+function(tsd_golden_carriage_returns var file)
+  file(READ ${file} hex HEX)
+  if(NOT hex MATCHES "0d")
+    return()
+  endif()
+  string(REGEX MATCHALL "[0-9a-f][0-9a-f]" bytes "${hex}")
+  list(FILTER bytes INCLUDE REGEX "^0d$")
+  list(LENGTH bytes count)
+  if(count GREATER 0)
+    set(${var} "${${var}}--- (${count} carriage returns above)\n" PARENT_SCOPE)
+  endif()
 endfunction()
 
 # Compares a transcript with the expectation file (or rewrites it when
@@ -62,20 +78,38 @@ endfunction()
 
 # Runs the tool and checks that what it writes as properties reads back as
 # itself: `tsd fmt` of the output gives the same lines again (comment lines
-# aside) and the output checks without errors. A run that fails must write
+# aside; with STATEMENTS, a statement file keeps its comments: the same
+# bytes) and the output checks without errors. A run that fails must write
 # nothing.
 function(tsd_golden_fixpoint)
-  cmake_parse_arguments(F "" "TOOL;DIR;OUTDIR;NAME" "ARGS" ${ARGN})
+  cmake_parse_arguments(F "STATEMENTS" "TOOL;DIR;OUTDIR;NAME" "ARGS" ${ARGN})
   unset(ENV{TSD_DEBUG_TRACE})
   unset(ENV{QOR_TSD_NO_SPECIAL_PARSER})
   unset(ENV{QOR_TSD_DEBUG_SPECIAL_PARSER})
   file(MAKE_DIRECTORY ${F_OUTDIR})
-  set(first ${F_OUTDIR}/${F_NAME}.first.props)
-  set(second ${F_OUTDIR}/${F_NAME}.second.props)
+  set(ext props)
+  if(F_STATEMENTS)
+    set(ext stmts)
+  endif()
+  set(first ${F_OUTDIR}/${F_NAME}.first.${ext})
+  set(second ${F_OUTDIR}/${F_NAME}.second.${ext})
   file(REMOVE ${first} ${second})
+
+  # Names taken from the netlist are taken so again when the output is
+  # read, and the notes that say so are no complaint.
+  set(again "")
+  if("--assume-netlist" IN_LIST F_ARGS)
+    set(again --assume-netlist)
+  endif()
+  macro(_tsd_drop_notes)
+    if(again)
+      string(REGEX REPLACE "[^\n]*: note: [^\n]*\n(   [^\n]*\n)*" "" err "${err}")
+    endif()
+  endmacro()
 
   execute_process(COMMAND ${F_TOOL} ${F_ARGS} WORKING_DIRECTORY ${F_DIR} OUTPUT_FILE ${first}
                   ERROR_VARIABLE err RESULT_VARIABLE status)
+  _tsd_drop_notes()
   file(READ ${first} once)
   if(NOT status EQUAL 0)
     if(NOT once STREQUAL "")
@@ -87,22 +121,61 @@ function(tsd_golden_fixpoint)
     message(FATAL_ERROR "the run succeeded but reported:\n${err}")
   endif()
 
-  execute_process(COMMAND ${F_TOOL} fmt ${first} OUTPUT_FILE ${second} ERROR_VARIABLE err
-                  RESULT_VARIABLE status)
+  execute_process(COMMAND ${F_TOOL} fmt ${again} ${first} OUTPUT_FILE ${second}
+                  ERROR_VARIABLE err RESULT_VARIABLE status)
   if(NOT status EQUAL 0)
     message(FATAL_ERROR "fmt of the output failed (${status}):\n${err}")
   endif()
   file(READ ${second} twice)
-  string(REGEX REPLACE "(^|\n)#[^\n]*" "" expected "${once}")
-  string(REGEX REPLACE "^\n+" "" expected "${expected}")
-  if(NOT expected STREQUAL twice)
+  set(expected "${once}")
+  set(got "${twice}")
+  if(F_STATEMENTS)
+    # Byte for byte, carriage returns included.
+    file(READ ${first} expected HEX)
+    file(READ ${second} got HEX)
+  else()
+    string(REGEX REPLACE "(^|\n)#[^\n]*" "" expected "${once}")
+    string(REGEX REPLACE "^\n+" "" expected "${expected}")
+  endif()
+  if(NOT expected STREQUAL got)
     message(FATAL_ERROR "the output does not read back as itself:\n--- output\n${once}"
                         "--- fmt of it\n${twice}")
   endif()
 
-  execute_process(COMMAND ${F_TOOL} check ${first} OUTPUT_VARIABLE out ERROR_VARIABLE err
-                  RESULT_VARIABLE status)
+  execute_process(COMMAND ${F_TOOL} check ${again} ${first} OUTPUT_VARIABLE out
+                  ERROR_VARIABLE err RESULT_VARIABLE status)
+  _tsd_drop_notes()
   if(NOT status EQUAL 0 OR NOT err STREQUAL "")
     message(FATAL_ERROR "the output does not check cleanly (${status}):\n${err}")
   endif()
+endfunction()
+
+# Converts a file both ways: its canonical property lines, written as
+# statements (or written back as the statement file it is) and read again,
+# are the same lines; and so are those lines written as statements and read
+# again.
+function(tsd_golden_conversion)
+  cmake_parse_arguments(C "" "TOOL;DIR;OUTDIR;NAME;INPUT" "" ${ARGN})
+  file(MAKE_DIRECTORY ${C_OUTDIR})
+  set(base ${C_OUTDIR}/${C_NAME})
+  function(_tsd_convert to input output)
+    execute_process(COMMAND ${C_TOOL} fmt --to ${to} ${input} -o ${output}
+                    WORKING_DIRECTORY ${C_DIR} ERROR_VARIABLE err RESULT_VARIABLE status)
+    if(NOT status EQUAL 0 OR NOT err STREQUAL "")
+      message(FATAL_ERROR "fmt --to ${to} ${input} failed (${status}):\n${err}")
+    endif()
+  endfunction()
+  _tsd_convert(props ${C_INPUT} ${base}.props)
+  _tsd_convert(statements ${C_INPUT} ${base}.stmts)
+  _tsd_convert(props ${base}.stmts ${base}.back.props)
+  _tsd_convert(statements ${base}.props ${base}.converted.stmts)
+  _tsd_convert(props ${base}.converted.stmts ${base}.converted.props)
+  file(READ ${base}.props lines)
+  foreach(form back converted)
+    file(READ ${base}.${form}.props again)
+    if(NOT again STREQUAL lines)
+      message(FATAL_ERROR "${base}.${form}.props differs from the canonical lines:\n"
+                          "--- canonical\n${lines}--- read back\n${again}")
+    endif()
+  endforeach()
 endfunction()

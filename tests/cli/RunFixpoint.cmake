@@ -3,10 +3,17 @@
 # checks without errors. A run that fails writes nothing.
 #
 #   cmake -DTSD=<tool> -DARGS=<arguments, separated by |> -DDIR=<where the tool runs>
-#         -DOUTDIR=<scratch> -DNAME=<case> -P RunFixpoint.cmake
+#         -DOUTDIR=<scratch> -DNAME=<case> [-DSTATEMENTS=ON] -P RunFixpoint.cmake
+#
+# With STATEMENTS the output is a statement file, which fmt writes back
+# byte for byte.
 cmake_minimum_required(VERSION 3.25)
 
 include(${CMAKE_CURRENT_LIST_DIR}/GoldenSupport.cmake)
 
 string(REPLACE "|" ";" args "${ARGS}")
-tsd_golden_fixpoint(TOOL ${TSD} ARGS ${args} DIR ${DIR} OUTDIR ${OUTDIR} NAME ${NAME})
+set(statements "")
+if(STATEMENTS)
+  set(statements STATEMENTS)
+endif()
+tsd_golden_fixpoint(${statements} TOOL ${TSD} ARGS ${args} DIR ${DIR} OUTDIR ${OUTDIR} NAME ${NAME})

@@ -23,5 +23,6 @@ tsd_golden_run(actual TOOL ${TSD} ARGS ${args} STDIN "${STDIN}" DIR ${SOURCE_DIR
 if(EXISTS ${written})
   file(READ ${written} content)
   tsd_golden_section(actual "written file" "${content}")
+  tsd_golden_carriage_returns(actual ${written})
 endif()
 tsd_golden_compare("${actual}" ${EXPECTED} ${OUTDIR}/${NAME}.actual)

@@ -26,14 +26,25 @@ struct Prop {
     const char* name;
     const char* value;
     const char* element = "";
+    std::uint32_t column = 0; // as a statement file's records have them
 };
 
 // The records of "f.props".
 PropStore store(const std::vector<Prop>& props) {
     PropStore store;
     store.addFile("f.props", "");
-    for (const Prop& p : props)
-        store.add(p.kind, 0, p.line, p.element, p.name, p.value);
+    for (const Prop& p : props) {
+        tsd_cli::StoredProp record;
+        record.kind = p.kind;
+        record.line = p.line;
+        record.column = p.column;
+        record.element = store.keep(p.element);
+        record.name = store.keep(p.name);
+        record.value = store.keep(p.value);
+        record.inArena =
+            tsd_cli::StoredProp::Element | tsd_cli::StoredProp::Name | tsd_cli::StoredProp::Value;
+        store.add(record);
+    }
     return store;
 }
 
@@ -45,11 +56,12 @@ RawMessage status(const std::string& text) {
     return {MessageSeverity::Status, text + "\n", ""};
 }
 
-// "line: text" for each diagnostic, details indented.
+// "line: text" (or "line:column: text") for each diagnostic, details indented.
 std::vector<std::string> lines(const std::vector<Diagnostic>& diags) {
     std::vector<std::string> out;
     for (const Diagnostic& d : diags) {
-        out.push_back(std::to_string(d.line) + ": " + d.text);
+        std::string column = d.column > 0 ? ":" + std::to_string(d.column) : "";
+        out.push_back(std::to_string(d.line) + column + ": " + d.text);
         for (const std::string& detail : d.details)
             out.push_back("  " + detail);
     }
@@ -150,6 +162,52 @@ TEST(Attribution, ContextlessMessagesGoToTheLineTheyQuote) {
     EXPECT_EQ(diags[1].details, (std::vector<std::string>{"   loop=loop2", "   loop2=loop"}));
     EXPECT_EQ(diags[3].details,
               (std::vector<std::string>{"   OFFSET=IN 1000 pS BEFORE other_clk"}));
+}
+
+TEST(Attribution, ClockNetMessagesGoToEachSpecTheyList) {
+    // Two and three specs on one missing clock net each; the records with
+    // a column stand for statements.
+    PropStore props = store({
+        {PropKind::Spec, 1, "TS_IFCLK", "PERIOD IFCLK_grp 20 ns"},
+        {PropKind::Spec, 2, "OFFSET", "IN 2 ns BEFORE IFCLK"},
+        {PropKind::Ref, 3, "TS_OFFSET", "IN 2 ns BEFORE IFCLK", "n1"},
+        {PropKind::Spec, 4, "TS20", "TIMEGRP pads OFFSET = OUT 4 ns AFTER IFCLK"},
+        {PropKind::Spec, 5, "OFFSET", "IN 3 BEFORE CLK2", "", 10},
+        {PropKind::Ref, 6, "TS_FEEDBACK", "1 ns NET CLK2", "fb", 12},
+        {PropKind::Spec, 7, "OFFSET", "IN:3:nS:BEFORE:CLK2", "", 14},
+    });
+    const std::string header =
+        "The following spec(s) referenced the Tsd_ClkGroup \"%\", but no such TS_CLKGRP "
+        "reference property was added to the builder:";
+    auto about = [&header](const std::string& clock) {
+        std::string text = header;
+        return text.replace(text.find('%'), 1, clock);
+    };
+    // The library lists the specs in its own order and with its own units:
+    // each goes to the record it stands for, the same shape to the first
+    // free one, a time without a unit by its words alone.
+    auto diags = attributeBuildMessages(
+        props,
+        {error(about("IFCLK")), status("   OFFSET=IN 2000 pS BEFORE IFCLK"),
+         status("   TIMEGRP pads OFFSET=OUT 4000 pS AFTER IFCLK"),
+         status("   OFFSET=IN 2000 pS BEFORE IFCLK"), error(about("CLK2")),
+         status("   FEEDBACK=1000 pS NET CLK2"), status("   OFFSET=IN 3000 pS BEFORE CLK2"),
+         status("   OFFSET=IN 3000 pS BEFORE CLK2")},
+        "f.props");
+    EXPECT_EQ(lines(diags), (Lines{
+                                "2: " + about("IFCLK"),
+                                "     OFFSET=IN 2000 pS BEFORE IFCLK",
+                                "4: " + about("IFCLK"),
+                                "     TIMEGRP pads OFFSET=OUT 4000 pS AFTER IFCLK",
+                                "3: " + about("IFCLK"),
+                                "     OFFSET=IN 2000 pS BEFORE IFCLK",
+                                "6:12: " + about("CLK2"),
+                                "     FEEDBACK=1000 pS NET CLK2",
+                                "7:14: " + about("CLK2"),
+                                "     OFFSET=IN 3000 pS BEFORE CLK2",
+                                "5:10: " + about("CLK2"),
+                                "     OFFSET=IN 3000 pS BEFORE CLK2",
+                            }));
 }
 
 TEST(Attribution, WhatCannotBeTiedToALineNamesTheFile) {

@@ -433,3 +433,39 @@ TEST(Statements, FormatIsToldByContent) {
     for (const Case& c : cases)
         EXPECT_EQ(detectFormat(c.text), c.format) << c.text;
 }
+
+TEST(Statements, PositionsInsideValues) {
+    // The word's first occurrence in the record's value, and where it stands
+    // in the text: across lines and comments, behind quotes, before the
+    // body of a group offset at the group's name.
+    struct Case {
+        const char* text;
+        const char* word;
+        const char* pos;
+    } cases[] = {
+        {"  TIMESPEC T = PERIOD x 10 ns HIHG;", "HIHG", "1:31"},
+        {"TIMESPEC T = FROM a # c\n  TO  b 1;", "TO", "2:3"},
+        {"TIMESPEC T = FROM a # c\n  TO  b 1;", "b", "2:7"},
+        {"TIMEGRP g = a EXCEPT\r\n\tEXCEPT b;", "b", "2:9"},
+        {"TIMEGRP p OFFSET = IN 1\n BEFORE k;", "k", "2:9"},
+        {"TIMEGRP p OFFSET = IN 1\n BEFORE k;", "p", "1:9"},
+        {"NET a TNM = \"my g\";", "g", "1:17"},
+        {"NET a LOC = x | TIG = TS1, 'TS2';", "TS2", "1:29"},
+        {"NET a TIG;", "", "1:7"},
+        {"NET a MAXDELAY =\n  2 furlongs;", "furlongs", "2:5"},
+    };
+    for (const Case& c : cases) {
+        StatementFile file = readStatements(c.text);
+        ASSERT_FALSE(file.records.empty()) << c.text;
+        const StatementRecord& record = file.records.back();
+        std::size_t offset = record.prop.value.find(c.word);
+        ASSERT_NE(offset, std::string::npos) << c.text;
+        EXPECT_EQ(pos(valuePosition(c.text, record, offset)), c.pos) << c.text << " " << c.word;
+    }
+    // A name's messages point at the name, the others at the attribute.
+    StatementFile file = readStatements("NET a TNM =\n  g | TIG | PERIOD = 1 ns;");
+    ASSERT_EQ(file.records.size(), 3u);
+    EXPECT_EQ(pos(recordPosition(file.records[0])), "2:3");
+    EXPECT_EQ(pos(recordPosition(file.records[1])), "2:7");
+    EXPECT_EQ(pos(recordPosition(file.records[2])), "2:13");
+}

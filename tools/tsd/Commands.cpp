@@ -2,9 +2,11 @@
 
 #include "Describe.h"
 #include "Graph.h"
+#include "Hints.h"
 #include "Json.h"
 #include "Pages.h"
 #include "Session.h"
+#include "Statements.h"
 
 #include "tsd/host/DumpStream.h"
 
@@ -14,7 +16,10 @@
 #include <fstream>
 #include <functional>
 #include <iostream>
+#include <limits>
 #include <sstream>
+#include <tuple>
+#include <unordered_map>
 #include <unordered_set>
 
 namespace tsd_cli {
@@ -40,6 +45,8 @@ void writeDiagnostics(JsonWriter& json, const Session& session) {
             json.number(diag.line);
         else
             json.null();
+        if (diag.column > 0) // only where it is known: never for property files
+            json.member("column", diag.column);
         json.member("severity", severityName(diag.severity))
             .member("text", diag.text)
             .key("details")
@@ -99,6 +106,280 @@ std::string_view orEmpty(const char* text) {
     return text != nullptr ? std::string_view(text) : std::string_view();
 }
 
+// --- Statement files ------------------------------------------------------
+
+// A statement file of the run, kept so that it can be written back.
+struct StatementInput {
+    std::uint32_t file = 0;
+    std::size_t firstRecord = 0; // the store's index of its first record
+    StatementFile parsed;
+};
+
+// The files of a run in the form each is read in; the statement files are
+// kept for writing.
+class Inputs {
+public:
+    explicit Inputs(const OutputOptions& options) : m_format(options.format) {}
+
+    // Reads the files into the session, each as the format it is.
+    void load(Session& session, const std::vector<std::string>& paths) {
+        std::vector<InputFile> inputs;
+        for (const std::string& path : paths)
+            inputs.push_back(readInput(path));
+        session.load(std::move(inputs), [this](Session& s, std::uint32_t file) {
+            if (!isStatements(s.store().fileText(file)))
+                return false;
+            read(s, file);
+            return true;
+        });
+    }
+
+    // Builds the design and places the messages about statement records
+    // at the word they are about.
+    void build(Session& session) const {
+        session.build();
+        if (!m_files.empty())
+            placeMessages(session);
+    }
+
+    // The statement file of store file `file`, or null for a property file.
+    const StatementInput* statements(std::uint32_t file) const {
+        for (const StatementInput& input : m_files)
+            if (input.file == file)
+                return &input;
+        return nullptr;
+    }
+
+private:
+    bool isStatements(std::string_view text) const {
+        if (!m_format.empty())
+            return m_format == "statements";
+        return detectFormat(text) == FileFormat::Statements;
+    }
+
+    void read(Session& session, std::uint32_t file) {
+        std::string_view text = session.store().fileText(file);
+        StatementInput input;
+        input.file = file;
+        input.firstRecord = session.store().size();
+        input.parsed = readStatements(text);
+        const std::string& name = session.store().fileName(file);
+        for (const StatementError& error : input.parsed.errors)
+            session.addDiagnostic(
+                {name, error.where.line, Severity::Error, error.text, {}, error.where.column});
+        for (const std::string& net : input.parsed.nets)
+            session.addDesignNet(net);
+        // The records of one statement share its element.
+        std::size_t elementOf = static_cast<std::size_t>(-1);
+        TextSpan element;
+        for (const StatementRecord& from : input.parsed.records) {
+            StoredProp record;
+            record.kind = from.prop.kind;
+            record.file = file;
+            TextPos at = recordPosition(from);
+            record.line = static_cast<std::uint32_t>(at.line);
+            record.column = static_cast<std::uint32_t>(at.column);
+            if (record.kind == PropKind::Ref) {
+                if (from.statement != elementOf) {
+                    element = session.store().keep(from.prop.element);
+                    elementOf = from.statement;
+                }
+                record.element = element;
+                record.inArena |= StoredProp::Element;
+            }
+            record.name = session.store().keep(from.prop.name);
+            record.inArena |= StoredProp::Name;
+            std::string_view written =
+                text.substr(from.valueBegin, from.valueEnd - from.valueBegin);
+            if (written == from.prop.value) {
+                record.value = session.store().spanIn(file, written);
+            } else {
+                record.value = session.store().keep(from.prop.value);
+                record.inArena |= StoredProp::Value;
+            }
+            session.add(record);
+        }
+        m_files.push_back(std::move(input));
+    }
+
+    void placeMessages(Session& session) const;
+
+    std::string m_format;
+    std::vector<StatementInput> m_files;
+};
+
+// Where in `value` a word stands on its own (not inside a longer word).
+std::size_t findWord(std::string_view value, std::string_view word) {
+    auto separator = [](char c) {
+        return c == ' ' || c == '\t' || c == ':' || c == '=' || c == '"' || c == '(' || c == ')' ||
+               c == ',';
+    };
+    for (std::size_t at = value.find(word); !word.empty() && at != std::string_view::npos;
+         at = value.find(word, at + 1)) {
+        std::size_t end = at + word.size();
+        if ((at == 0 || separator(value[at - 1])) && (end == value.size() || separator(value[end])))
+            return at;
+    }
+    return std::string_view::npos;
+}
+
+// The byte of a record's value that a message about it is about: the one
+// its caret line points at, else the first quoted word of the message
+// (after the context that repeats the definition) that stands in the value.
+std::size_t offsetInValue(const std::string& text, const std::string& context,
+                          std::string_view name, std::string_view value) {
+    std::size_t caret = text.rfind('\n');
+    if (caret != std::string::npos && text.find_first_not_of(' ', caret + 1) != std::string::npos &&
+        text[text.find_first_not_of(' ', caret + 1)] == '^' && text.back() == '^') {
+        std::size_t column = text.size() - 1 - (caret + 1);
+        return column > name.size() ? column - name.size() - 1 : std::string_view::npos;
+    }
+    std::string_view rest = text;
+    if (rest.substr(0, context.size()) == context)
+        rest.remove_prefix(context.size());
+    rest = rest.substr(0, rest.find('\n'));
+    for (std::size_t open = rest.find('"'); open != std::string_view::npos;) {
+        std::size_t close = rest.find('"', open + 1);
+        if (close == std::string_view::npos)
+            break;
+        std::size_t at = findWord(value, rest.substr(open + 1, close - open - 1));
+        if (at != std::string_view::npos)
+            return at;
+        open = rest.find('"', close + 1);
+    }
+    return std::string_view::npos;
+}
+
+void Inputs::placeMessages(Session& session) const {
+    const PropStore& store = session.store();
+    std::vector<Diagnostic>& diags = session.diagnostics();
+    for (const StatementInput& input : m_files) {
+        const std::string& name = store.fileName(input.file);
+        // Records by the position a message about them carries.
+        std::unordered_map<std::uint64_t, std::size_t> byPos;
+        auto key = [](int line, int column) {
+            return (static_cast<std::uint64_t>(line) << 32) | static_cast<std::uint32_t>(column);
+        };
+        for (Diagnostic& diag : diags) {
+            if (diag.file != name || diag.line <= 0 || diag.column <= 0)
+                continue;
+            if (byPos.empty())
+                for (std::size_t i = 0; i < input.parsed.records.size(); ++i) {
+                    TextPos at = recordPosition(input.parsed.records[i]);
+                    byPos.emplace(key(at.line, at.column), i);
+                }
+            auto found = byPos.find(key(diag.line, diag.column));
+            if (found == byPos.end())
+                continue;
+            const StatementRecord& record = input.parsed.records[found->second];
+            const StoredProp& stored = store[input.firstRecord + found->second];
+            std::string context = record.prop.kind == PropKind::Ref
+                                      ? std::string()
+                                      : processingContext(store, stored);
+            std::size_t offset =
+                offsetInValue(diag.text, context, record.prop.name, record.prop.value);
+            if (offset == std::string_view::npos || offset >= record.prop.value.size())
+                continue;
+            TextPos at = valuePosition(store.fileText(input.file), record, offset);
+            diag.line = at.line;
+            diag.column = at.column;
+        }
+    }
+    // People read a file from the top: a message that moved to a later line
+    // of its statement moves among the others; on one line, by column.
+    std::unordered_map<std::string_view, std::size_t> fileOrder;
+    for (std::size_t i = 0; i < session.fileNames().size(); ++i)
+        fileOrder.emplace(session.fileNames()[i], i);
+    auto rank = [&](const Diagnostic& diag) {
+        auto file = fileOrder.find(diag.file);
+        return std::make_tuple(file != fileOrder.end() ? file->second : fileOrder.size() + 1,
+                               diag.line > 0 ? diag.line : std::numeric_limits<int>::max(),
+                               diag.column);
+    };
+    std::stable_sort(diags.begin(), diags.end(),
+                     [&](const Diagnostic& a, const Diagnostic& b) { return rank(a) < rank(b); });
+}
+
+// The objects that the group and spec records of a statement file made,
+// found after the build (trimming hides trashed ones from the finds): user
+// groups by name, endpoint specs by TSid, offsets and path controls by
+// their order, which is the order of their records. Null where no object
+// can be told for certain: such a record is written as it stands.
+std::vector<Tsd_BaseObj*> recordObjects(Session& session, const StatementInput& input) {
+    Tsd_Design& design = session.design();
+    const std::vector<StatementRecord>& records = input.parsed.records;
+    std::vector<Tsd_BaseObj*> objects(records.size(), nullptr);
+    auto listed = [](Tsd_BaseObjList* list) {
+        std::vector<Tsd_BaseObj*> out;
+        Tsd_BaseObjListIter iter(list);
+        while (Tsd_BaseObj* obj = iter.next())
+            if (!obj->refOwner())
+                out.push_back(obj);
+        return out;
+    };
+    // The builder adds offsets and path controls in the order of their
+    // records.
+    std::vector<std::size_t> offsetRecords;
+    std::vector<std::size_t> controlRecords;
+    for (std::size_t i = 0; i < records.size(); ++i) {
+        const PropRecord& prop = records[i].prop;
+        if (prop.kind == PropKind::Group) {
+            objects[i] = design.findGroupByUserName(prop.name.c_str(), false);
+        } else if (prop.kind == PropKind::Spec) {
+            if (equalsNoCase(prop.name, "ENABLE") || equalsNoCase(prop.name, "DISABLE"))
+                controlRecords.push_back(i);
+            else if (Tsd_EndpointSpec* spec =
+                         design.findEndpointSpecByTSid(prop.name.c_str(), false))
+                objects[i] = spec;
+            else
+                offsetRecords.push_back(i);
+        }
+    }
+    // Records that made no object (or several files) leave the counts
+    // apart: then the records are written as they stand.
+    auto pair = [&objects](const std::vector<std::size_t>& mine,
+                           const std::vector<Tsd_BaseObj*>& all) {
+        if (all.size() == mine.size())
+            for (std::size_t k = 0; k < mine.size(); ++k)
+                objects[mine[k]] = all[k];
+    };
+    pair(offsetRecords, listed(design.getOffsetSpecList()));
+    pair(controlRecords, listed(design.getPathControlList()));
+    return objects;
+}
+
+// One output per record of a statement file: its canonical value, or a
+// drop for what is gone (a withdrawn reference, a trashed object).
+std::vector<RecordOutput> statementOutputs(Session& session, const StatementInput& input,
+                                           const std::vector<Tsd_BaseObj*>& objects,
+                                           const std::unordered_set<Tsd_BaseObj*>& trashed) {
+    Tsd_Annotator annotator(&session.design());
+    const std::vector<StatementRecord>& records = input.parsed.records;
+    std::vector<RecordOutput> outputs;
+    outputs.reserve(records.size());
+    for (std::size_t i = 0; i < records.size(); ++i) {
+        const StatementRecord& record = records[i];
+        if (record.prop.kind == PropKind::Ref) {
+            CliRef* ref = session.refOf(input.firstRecord + i);
+            const char* name = nullptr;
+            const char* value = nullptr;
+            if (ref == nullptr || !annotator.getRefProp(ref, name, value))
+                outputs.push_back(RecordOutput::drop());
+            else
+                outputs.push_back(RecordOutput::canonical(std::string(orEmpty(value))));
+            continue;
+        }
+        Tsd_BaseObj* obj = objects[i];
+        if (obj != nullptr && trashed.count(obj) != 0) {
+            outputs.push_back(RecordOutput::drop());
+            continue;
+        }
+        ObjectProp prop = obj != nullptr ? objectProp(obj) : ObjectProp();
+        outputs.push_back(RecordOutput::canonical(prop.ok ? prop.value : record.prop.value));
+    }
+    return outputs;
+}
+
 // Hands `visit` the canonical properties, as the design writes them back:
 // the groups, then the specifications, then each reference record in input
 // order that an active object still owns. The texts are valid during the
@@ -131,6 +412,30 @@ void appendCanonicalText(std::string& out, Session& session) {
     forEachCanonicalProp(session, [&](PropKind kind, std::string_view element,
                                       std::string_view name, std::string_view value) {
         appendDesignLine(out, scratch, kind, element, name, value);
+    });
+}
+
+// The statement file written back with the design's canonical values.
+void appendStatementText(std::string& out, Session& session, const StatementInput& input,
+                         const std::vector<Tsd_BaseObj*>& objects,
+                         const std::unordered_set<Tsd_BaseObj*>& trashed) {
+    out += writeStatements(session.store().fileText(input.file), input.parsed,
+                           statementOutputs(session, input, objects, trashed));
+}
+
+// The canonical properties as statements, one per line.
+void appendCanonicalStatements(std::string& out, Session& session) {
+    std::string statement;
+    std::string error;
+    forEachCanonicalProp(session, [&](PropKind kind, std::string_view element,
+                                      std::string_view name, std::string_view value) {
+        PropRecord prop{kind, std::string(element), std::string(name), std::string(value)};
+        if (propToStatement(prop, statement, error)) {
+            out += statement;
+            out += '\n';
+        } else {
+            session.addDiagnostic({session.displayFile(), 0, Severity::Error, error, {}});
+        }
     });
 }
 
@@ -177,11 +482,11 @@ using JsonMembers = std::function<void(JsonWriter&)>;
 // Loads and builds one file. On errors reports them (as JSON: the members
 // `product` writes for an empty product, then the diagnostics) and returns
 // false.
-bool loadAndBuild(Session& session, const std::vector<std::string>& files,
+bool loadAndBuild(Session& session, Inputs& inputs, const std::vector<std::string>& files,
                   const OutputOptions& options, const JsonMembers& product) {
     installFatalHandler(session, options);
-    session.load(files);
-    session.build();
+    inputs.load(session, files);
+    inputs.build(session);
     if (session.errorCount() == 0)
         return true;
     if (options.json) {
@@ -231,8 +536,9 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
     Session session;
     session.setAssumeNetlist(options.assumeNetlist);
     installFatalHandler(session, options);
-    session.load(files);
-    session.build();
+    Inputs inputs(options);
+    inputs.load(session, files);
+    inputs.build(session);
 
     int errors = session.errorCount();
     int warnings = session.warningCount();
@@ -277,7 +583,8 @@ int runCheck(const std::vector<std::string>& files, const OutputOptions& options
 int runFmt(const std::string& file, const OutputOptions& options) {
     Session session;
     session.setAssumeNetlist(options.assumeNetlist);
-    if (!loadAndBuild(session, {file}, options, writeEmptyLists))
+    Inputs inputs(options);
+    if (!loadAndBuild(session, inputs, {file}, options, writeEmptyLists))
         return kExitErrors;
     std::string out = outputBuffer(session, options);
     if (options.json) {
@@ -287,19 +594,28 @@ int runFmt(const std::string& file, const OutputOptions& options) {
         writeDiagnostics(json, session);
         json.endObject().finish();
         emit(options, out);
-    } else {
-        appendCanonicalText(out, session);
-        emit(options, out);
-        printDiagnostics(session); // whatever the write-back reported
+        return session.errorCount() == 0 ? kExitOk : kExitErrors;
     }
+    const StatementInput* statements = inputs.statements(0);
+    if (statements != nullptr && options.to != "props")
+        appendStatementText(out, session, *statements, recordObjects(session, *statements), {});
+    else if (statements == nullptr && options.to == "statements")
+        appendCanonicalStatements(out, session);
+    else
+        appendCanonicalText(out, session);
+    // What cannot be converted is an error, and nothing is written.
+    if (session.errorCount() == 0)
+        emit(options, out);
+    printDiagnostics(session); // whatever the write-back reported
     return session.errorCount() == 0 ? kExitOk : kExitErrors;
 }
 
 int runDump(const std::string& file, const OutputOptions& options) {
     Session session;
     session.setAssumeNetlist(options.assumeNetlist);
-    session.load({file});
-    session.build();
+    Inputs inputs(options);
+    inputs.load(session, {file});
+    inputs.build(session);
     printDiagnostics(session);
     DumpStream stream(std::cout);
     session.builder().dump(stream, 0);
@@ -314,7 +630,8 @@ int runHolders(const std::string& file, const std::string& group, const OutputOp
     auto emptyProduct = [&group](JsonWriter& json) {
         json.member("group", group).key("holders").beginArray().endArray();
     };
-    if (!loadAndBuild(session, {file}, options, emptyProduct))
+    Inputs inputs(options);
+    if (!loadAndBuild(session, inputs, {file}, options, emptyProduct))
         return kExitErrors;
     Tsd_Group* found = findAnyGroup(session.design(), group);
     if (found == nullptr) {
@@ -379,7 +696,8 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         json.key("trashed").beginArray().endArray();
         writeEmptyLists(json);
     };
-    if (!loadAndBuild(session, {file}, options, emptyProduct))
+    Inputs inputs(options);
+    if (!loadAndBuild(session, inputs, {file}, options, emptyProduct))
         return kExitErrors;
 
     // An element named twice: the first time took every record.
@@ -405,8 +723,14 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         TrimReasonText why;
     };
     std::vector<Trashed> trashed;
-    session.design().onTrashed = [&trashed](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
+    std::unordered_set<Tsd_BaseObj*> trashedObjects;
+    // Which object each statement makes is told before trimming hides some.
+    std::vector<Tsd_BaseObj*> objects;
+    if (const StatementInput* statements = inputs.statements(0))
+        objects = recordObjects(session, *statements);
+    session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
         trashed.push_back({objectClass(obj), objectName(obj), trimReasonText(reason)});
+        trashedObjects.insert(obj);
     };
     session.design().trim();
     session.design().onTrashed = nullptr;
@@ -434,6 +758,20 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         json.endObject().finish();
         emit(options, out);
     } else {
+        const StatementInput* statements = inputs.statements(0);
+        // A statement file's comments end their lines as its lines do, and
+        // come after its byte-order mark.
+        std::string_view eol = "\n";
+        std::string_view bom;
+        if (statements != nullptr) {
+            std::string_view text = session.store().fileText(statements->file);
+            std::size_t newline = text.find('\n');
+            if (newline != std::string_view::npos && newline > 0 && text[newline - 1] == '\r')
+                eol = "\r\n";
+            if (text.substr(0, 3) == "\xEF\xBB\xBF")
+                bom = text.substr(0, 3);
+            out += bom;
+        }
         for (const Trashed& entry : trashed) {
             out += "# trashed ";
             out += entry.cls;
@@ -441,9 +779,16 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
             out += inQuotes(entry.name);
             out += ": ";
             out += entry.why.explanation;
-            out += '\n';
+            out += eol;
         }
-        appendCanonicalText(out, session);
+        if (statements != nullptr) {
+            std::size_t start = out.size();
+            appendStatementText(out, session, *statements, objects, trashedObjects);
+            if (!bom.empty() && out.compare(start, bom.size(), bom) == 0)
+                out.erase(start, bom.size());
+        } else {
+            appendCanonicalText(out, session);
+        }
         emit(options, out);
         printDiagnostics(session);
     }
@@ -455,7 +800,8 @@ int runGraph(const std::string& file, const OutputOptions& options) {
     session.setAssumeNetlist(options.assumeNetlist);
     OutputOptions textOnly = options;
     textOnly.json = false;
-    if (!loadAndBuild(session, {file}, textOnly, JsonMembers()))
+    Inputs inputs(options);
+    if (!loadAndBuild(session, inputs, {file}, textOnly, JsonMembers()))
         return kExitErrors;
     std::ostringstream dot;
     writeDot(dot, session.design());

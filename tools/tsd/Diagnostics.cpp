@@ -1,6 +1,8 @@
 #include "Diagnostics.h"
 
 #include <algorithm>
+#include <cstdio>
+#include <cstdlib>
 #include <memory>
 #include <ostream>
 #include <unordered_map>
@@ -178,18 +180,113 @@ private:
     Index m_tigRefs;
 };
 
+const NamePattern* matchingPattern(const std::string& text, std::string_view& name) {
+    for (const NamePattern& pattern : kNamePatterns)
+        if (quotedName(text, pattern, name))
+            return &pattern;
+    return nullptr;
+}
+
 std::size_t recordForQuotedName(const PropStore& store, std::unique_ptr<NameIndex>& index,
                                 const std::string& text) {
     std::string_view name;
-    for (const NamePattern& pattern : kNamePatterns) {
-        if (quotedName(text, pattern, name)) {
-            if (!index)
-                index = std::make_unique<NameIndex>(store);
-            return index->find(pattern.target, name);
-        }
-    }
-    return kNone;
+    const NamePattern* pattern = matchingPattern(text, name);
+    if (pattern == nullptr)
+        return kNone;
+    if (!index)
+        index = std::make_unique<NameIndex>(store);
+    return index->find(pattern->target, name);
 }
+
+// A spec as the clock message lists it ("OFFSET=IN 2000 pS BEFORE clk")
+// and as a record holds it ("IN 2 ns BEFORE clk") compare by their words:
+// keywords that only one side spells out are left out, times are taken in
+// picoseconds, and the loose form leaves out numbers and units altogether.
+std::string clockKey(std::string_view text, bool loose) {
+    static constexpr struct {
+        const char* unit;
+        double scale;
+    } kUnits[] = {{"PS", 1}, {"NS", 1e3}, {"US", 1e6}, {"MS", 1e9}};
+    std::vector<std::string> words = valueWords(text);
+    std::string key;
+    for (std::size_t i = 0; i < words.size(); ++i) {
+        std::string word = words[i];
+        for (char& c : word)
+            c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
+        if (word == "OFFSET" || word == "FEEDBACK" || word == "TIMEGRP")
+            continue;
+        char* end = nullptr;
+        double number = std::strtod(word.c_str(), &end);
+        bool isNumber = !word.empty() && end == word.c_str() + word.size();
+        if (isNumber) {
+            double scale = 0;
+            if (i + 1 < words.size())
+                for (const auto& unit : kUnits)
+                    if (isRefNamed(words[i + 1], unit.unit))
+                        scale = unit.scale;
+            if (scale != 0)
+                ++i;
+            if (loose)
+                continue;
+            char buffer[32];
+            std::snprintf(buffer, sizeof buffer, "%.9g%s", scale != 0 ? number * scale : number,
+                          scale != 0 ? "ps" : "");
+            word = buffer;
+        }
+        key += word;
+        key += ' ';
+    }
+    return key;
+}
+
+// The records that may be listed under a missing clock net: spec records
+// and TS_OFFSET and TS_FEEDBACK references, by each word of their values.
+class ClockUsers {
+public:
+    explicit ClockUsers(const PropStore& store) : m_store(store), m_used(store.size(), false) {
+        for (std::size_t i = 0; i < store.size(); ++i) {
+            const StoredProp& record = store[i];
+            std::string_view name = store.name(record);
+            if (record.kind == PropKind::Spec ||
+                (record.kind == PropKind::Ref &&
+                 (isRefNamed(name, "TS_OFFSET") || isRefNamed(name, "TS_FEEDBACK"))))
+                for (std::string& word : valueWords(store.value(record)))
+                    m_byWord[std::move(word)].push_back(i);
+        }
+        for (auto& entry : m_byWord) // a word that stands twice in one value
+            entry.second.erase(std::unique(entry.second.begin(), entry.second.end()),
+                               entry.second.end());
+    }
+
+    // The record that a detail line under clock `clock` stands for: the
+    // first one not yet taken whose value matches it exactly, else loosely,
+    // else any that names the clock; kNone when none is left.
+    std::size_t take(std::string_view clock, std::string_view detail) {
+        auto found = m_byWord.find(std::string(clock));
+        if (found == m_byWord.end())
+            return kNone;
+        const std::vector<std::size_t>& candidates = found->second;
+        while (!detail.empty() && (detail.front() == ' ' || detail.front() == '\t'))
+            detail.remove_prefix(1);
+        for (int pass = 0; pass < 3; ++pass) {
+            std::string key = pass < 2 ? clockKey(detail, pass == 1) : std::string();
+            for (std::size_t record : candidates) {
+                if (m_used[record])
+                    continue;
+                if (pass < 2 && clockKey(m_store.value(m_store[record]), pass == 1) != key)
+                    continue;
+                m_used[record] = true;
+                return record;
+            }
+        }
+        return kNone;
+    }
+
+private:
+    const PropStore& m_store;
+    std::unordered_map<std::string, std::vector<std::size_t>> m_byWord;
+    std::vector<bool> m_used;
+};
 
 // The group and spec records of each processing context, in input order.
 using ContextLines = std::unordered_map<std::string, std::vector<std::size_t>>;
@@ -226,7 +323,7 @@ bool isFailure(Severity severity) {
 }
 
 void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
-                       const std::string& text, const std::string& file, int line) {
+                       const std::string& text, const std::string& file, int line, int column) {
     std::string body = withoutFinalNewline(text);
     bool detail =
         severity == MessageSeverity::Status && !body.empty() && (body[0] == ' ' || body[0] == '\t');
@@ -237,6 +334,7 @@ void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
     Diagnostic diag;
     diag.file = file;
     diag.line = line;
+    diag.column = column;
     diag.severity = fromMessageSeverity(severity);
     diag.text = body;
     diags.push_back(std::move(diag));
@@ -270,13 +368,52 @@ std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
     std::size_t previousLine = kNone;
     std::unordered_map<std::size_t, std::unordered_set<std::string>> textsOnLine;
 
+    // After a clock message: the clock, and whether its diagnostic holds a
+    // listed spec yet.
+    std::unique_ptr<ClockUsers> clockUsers;
+    std::string clock;
+    bool clockOpen = false;
+    bool clockPlaced = false;
+
+    auto add = [&](const RawMessage& message, std::size_t record) {
+        if (record != kNone) {
+            const StoredProp& r = store[record];
+            addLibraryMessage(diags, message.severity, message.text, store.fileName(r),
+                              static_cast<int>(r.line), static_cast<int>(r.column));
+        } else {
+            addLibraryMessage(diags, message.severity, message.text, fallbackFile, 0);
+        }
+    };
+
     for (const RawMessage& message : messages) {
         bool isDetail = message.severity == MessageSeverity::Status && !message.text.empty() &&
                         (message.text[0] == ' ' || message.text[0] == '\t');
+        if (isDetail && clockOpen) {
+            // Each listed spec is reported at its own record.
+            if (!clockUsers)
+                clockUsers = std::make_unique<ClockUsers>(store);
+            std::size_t record = clockUsers->take(clock, withoutFinalNewline(message.text));
+            if (record != kNone && clockPlaced) {
+                Diagnostic copy = diags.back();
+                copy.details.clear();
+                diags.push_back(std::move(copy));
+            }
+            if (record != kNone) {
+                const StoredProp& r = store[record];
+                Diagnostic& diag = diags.back();
+                diag.file = store.fileName(r);
+                diag.line = static_cast<int>(r.line);
+                diag.column = static_cast<int>(r.column);
+                clockPlaced = true;
+            }
+            addLibraryMessage(diags, message.severity, message.text, "", 0);
+            continue;
+        }
         if (isDetail && !diags.empty()) {
             addLibraryMessage(diags, message.severity, message.text, "", 0);
             continue;
         }
+        clockOpen = false;
         std::size_t chosen = kNone;
         if (!message.context.empty()) {
             if (message.context == previousContext && previousLine != kNone &&
@@ -309,15 +446,16 @@ std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,
         } else {
             previousContext.clear();
             previousLine = kNone;
+            std::string_view name;
+            const NamePattern* pattern = matchingPattern(message.text, name);
+            if (pattern != nullptr && pattern->target == Target::ClockUser) {
+                clockOpen = true;
+                clockPlaced = false;
+                clock = std::string(name);
+            }
             chosen = recordForQuotedName(store, names, message.text);
         }
-        if (chosen != kNone) {
-            const StoredProp& record = store[chosen];
-            addLibraryMessage(diags, message.severity, message.text, store.fileName(record),
-                              static_cast<int>(record.line));
-        } else {
-            addLibraryMessage(diags, message.severity, message.text, fallbackFile, 0);
-        }
+        add(message, chosen);
     }
     return diags;
 }

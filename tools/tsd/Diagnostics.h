@@ -38,7 +38,7 @@ struct RawMessage {
 // Adds a library message to `diags`: a status line that begins with a blank
 // is a detail line of the previous diagnostic; anything else starts a new one.
 void addLibraryMessage(std::vector<Diagnostic>& diags, MessageSeverity severity,
-                       const std::string& text, const std::string& file, int line);
+                       const std::string& text, const std::string& file, int line, int column = 0);
 
 // The context under which the builder processes a stored group or spec record.
 std::string processingContext(const PropStore& store, const StoredProp& record);
@@ -46,7 +46,9 @@ std::string processingContext(const PropStore& store, const StoredProp& record);
 // Ties the messages of a build to the records of `store` (in the order they
 // were handed to the builder): messages issued while a stored property was
 // processed go to the record with that context; the others go to the record
-// that defines or names what they quote, when it can be found. Messages tied
+// that defines or names what they quote, when it can be found. A message
+// that lists the specs using a missing clock net becomes one diagnostic per
+// listed spec, at its record, with that spec's detail line. Messages tied
 // to no record name `fallbackFile` (which may be empty). Costs nothing
 // without messages; the indexes it needs are made on first need.
 std::vector<Diagnostic> attributeBuildMessages(const PropStore& store,

@@ -197,6 +197,10 @@ void Session::load(const std::vector<std::string>& paths) {
 }
 
 void Session::load(std::vector<InputFile> inputs) {
+    load(std::move(inputs), FileReader());
+}
+
+void Session::load(std::vector<InputFile> inputs, const FileReader& reader) {
     m_displayFile = inputs.size() == 1 ? inputs.front().displayName : std::string();
     std::size_t lines = 0;
     for (const InputFile& input : inputs)
@@ -211,7 +215,8 @@ void Session::load(std::vector<InputFile> inputs) {
     for (InputFile& input : inputs)
         files.push_back(addFile(std::move(input)));
     for (std::uint32_t file : files)
-        readPropFile(file);
+        if (!reader || !reader(*this, file))
+            readPropFile(file);
 }
 
 std::uint32_t Session::addFile(InputFile input) {
@@ -290,7 +295,8 @@ void Session::lineError(const StoredProp& record, std::string text) {
                        static_cast<int>(record.line),
                        Severity::Error,
                        std::move(text),
-                       {}});
+                       {},
+                       static_cast<int>(record.column)});
 }
 
 void Session::feed(std::size_t index) {
@@ -484,7 +490,7 @@ void Session::deliver(const MessageRecord& record) {
     } else if (m_currentRecord >= 0) {
         const StoredProp& prop = m_store[static_cast<std::size_t>(m_currentRecord)];
         addLibraryMessage(m_diags, record.severity, record.text, m_store.fileName(prop),
-                          static_cast<int>(prop.line));
+                          static_cast<int>(prop.line), static_cast<int>(prop.column));
     } else {
         addLibraryMessage(m_diags, record.severity, record.text, m_displayFile, 0);
     }

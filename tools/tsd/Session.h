@@ -126,6 +126,11 @@ public:
     // hands their lines to the builder in order.
     void load(const std::vector<std::string>& paths);
     void load(std::vector<InputFile> inputs);
+    // The same, with a reader of other formats: it is asked first for each
+    // file (once every file is kept) and returns false to leave the file to
+    // the property-file reader.
+    using FileReader = std::function<bool(Session&, std::uint32_t file)>;
+    void load(std::vector<InputFile> inputs, const FileReader& reader);
 
     // Keeps the text of a file read in another format; its index in the
     // store. Throws IoError when the files together pass PropStore::kMaxText.
@@ -163,6 +168,8 @@ public:
     std::vector<std::size_t> recordsOwnedBy(Tsd_BaseObj* owner) const;
 
     const std::vector<Diagnostic>& diagnostics() const { return m_diags; }
+    // For a reader that places messages more exactly than by their record.
+    std::vector<Diagnostic>& diagnostics() { return m_diags; }
     int errorCount() const;
     int warningCount() const;
     int countOf(PropKind kind) const;

@@ -1076,6 +1076,62 @@ std::string writeStatements(std::string_view text, const StatementFile& file,
     return Writer(text, file, outputs).run();
 }
 
+TextPos recordPosition(const StatementRecord& record) {
+    return record.form == ValueForm::Name && record.valueWhere.line > 0 ? record.valueWhere
+                                                                        : record.where;
+}
+
+TextPos valuePosition(std::string_view text, const StatementRecord& record, std::size_t offset) {
+    const TextPos start = record.valueWhere;
+    if (record.form == ValueForm::Implied || start.line == 0)
+        return recordPosition(record);
+    if (record.form == ValueForm::Name) {
+        bool quoted = record.valueBegin < record.valueEnd &&
+                      (text[record.valueBegin] == '"' || text[record.valueBegin] == '\'');
+        offset = std::min(offset, record.prop.value.size());
+        return {start.line, start.column + static_cast<int>(offset) + (quoted ? 1 : 0)};
+    }
+    // The value reads its tokens with every gap that holds a line end or a
+    // comment as one blank: walk them the same way.
+    struct Piece {
+        std::size_t at; // offset in the value
+        TextPos pos;
+    };
+    std::vector<Piece> pieces;
+    std::size_t length = 0;
+    Lexer lexer(text, record.valueBegin, record.valueEnd, true);
+    std::size_t previousEnd = std::string_view::npos;
+    for (Token token = lexer.next(); token.kind != Tok::End; token = lexer.next()) {
+        if (previousEnd != std::string_view::npos) {
+            std::string_view gap = text.substr(previousEnd, token.begin - previousEnd);
+            bool plain = gap.find_first_not_of(" \t") == std::string_view::npos;
+            length += plain ? gap.size() : 1;
+        }
+        TextPos pos = token.pos;
+        if (pos.line == 1)
+            pos.column += start.column - 1; // the lexer counts from the value's first byte
+        pos.line += start.line - 1;
+        pieces.push_back({length, pos});
+        length += token.end - token.begin;
+        previousEnd = token.end;
+    }
+    if (record.form == ValueForm::OffsetBody) {
+        std::size_t prefix = record.prop.value.size() - std::min(length, record.prop.value.size());
+        if (offset < prefix)
+            return record.where;
+        offset -= prefix;
+    }
+    if (pieces.empty())
+        return start;
+    auto piece = std::upper_bound(pieces.begin(), pieces.end(), offset,
+                                  [](std::size_t at, const Piece& p) { return at < p.at; });
+    if (piece != pieces.begin())
+        --piece;
+    TextPos pos = piece->pos;
+    pos.column += static_cast<int>(offset - piece->at);
+    return pos;
+}
+
 bool statementName(std::string_view name, std::string& out) {
     if (name.empty() || name.find('\n') != std::string_view::npos)
         return false;

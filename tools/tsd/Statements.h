@@ -116,6 +116,17 @@ struct StatementFile {
     std::set<std::string> nets;
 };
 
+// Where a message about a record points: the name of a name value (TNM,
+// TPTHRU, a TSid of a TIG list, ...), else the attribute, keyword or the
+// name a TIMESPEC or TIMEGRP defines.
+TextPos recordPosition(const StatementRecord& record);
+
+// Where byte `offset` of `record.prop.value` stands in `text` (the text the
+// record was read from): inside a constraint value across its lines and
+// comments, inside a name behind its quote; before the value, the record's
+// position.
+TextPos valuePosition(std::string_view text, const StatementRecord& record, std::size_t offset);
+
 // Reads the whole text; never throws on bad input. A statement with an
 // unterminated quote or a malformed head (a TIMESPEC without "=") gives an
 // error and no records; a statement without its ';' gives an error but keeps
