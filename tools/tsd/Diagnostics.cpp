@@ -199,9 +199,10 @@ std::size_t recordForQuotedName(const PropStore& store, std::unique_ptr<NameInde
 }
 
 // A spec as the clock message lists it ("OFFSET=IN 2000 pS BEFORE clk")
-// and as a record holds it ("IN 2 ns BEFORE clk") compare by their words:
-// keywords that only one side spells out are left out, times are taken in
-// picoseconds, and the loose form leaves out numbers and units altogether.
+// and as a record holds it ("IN 2 ns BEFORE clk TIMEGRP regs") compare by
+// their words: keywords that only one side spells out, and the register
+// group after TIMEGRP, are left out, times are taken in picoseconds, and the
+// loose form leaves out numbers and units altogether.
 std::string clockKey(std::string_view text, bool loose) {
     static constexpr struct {
         const char* unit;
@@ -213,8 +214,12 @@ std::string clockKey(std::string_view text, bool loose) {
         std::string word = words[i];
         for (char& c : word)
             c = static_cast<char>(std::toupper(static_cast<unsigned char>(c)));
-        if (word == "OFFSET" || word == "FEEDBACK" || word == "TIMEGRP")
+        if (word == "OFFSET" || word == "FEEDBACK")
             continue;
+        if (word == "TIMEGRP") {
+            ++i;
+            continue;
+        }
         char* end = nullptr;
         double number = std::strtod(word.c_str(), &end);
         bool isNumber = !word.empty() && end == word.c_str() + word.size();
@@ -260,31 +265,58 @@ public:
 
     // The record that a detail line under clock `clock` stands for: the
     // first one not yet taken whose value matches it exactly, else loosely,
-    // else any that names the clock; kNone when none is left.
+    // else any that names the clock; kNone when none is left. Each record's
+    // keys are made once, so a clock that many specs name costs linear time.
     std::size_t take(std::string_view clock, std::string_view detail) {
         auto found = m_byWord.find(std::string(clock));
         if (found == m_byWord.end())
             return kNone;
-        const std::vector<std::size_t>& candidates = found->second;
+        Users& users = m_users[found->first];
+        if (!users.made) {
+            users.made = true;
+            for (std::size_t record : found->second) {
+                std::string_view value = m_store.value(m_store[record]);
+                users.byKey[0][clockKey(value, false)].records.push_back(record);
+                users.byKey[1][clockKey(value, true)].records.push_back(record);
+                users.any.records.push_back(record);
+            }
+        }
         while (!detail.empty() && (detail.front() == ' ' || detail.front() == '\t'))
             detail.remove_prefix(1);
         for (int pass = 0; pass < 3; ++pass) {
-            std::string key = pass < 2 ? clockKey(detail, pass == 1) : std::string();
-            for (std::size_t record : candidates) {
-                if (m_used[record])
+            Queue* queue = &users.any;
+            if (pass < 2) {
+                auto match = users.byKey[pass].find(clockKey(detail, pass == 1));
+                if (match == users.byKey[pass].end())
                     continue;
-                if (pass < 2 && clockKey(m_store.value(m_store[record]), pass == 1) != key)
-                    continue;
-                m_used[record] = true;
-                return record;
+                queue = &match->second;
+            }
+            while (queue->next < queue->records.size()) {
+                std::size_t record = queue->records[queue->next++];
+                if (!m_used[record]) {
+                    m_used[record] = true;
+                    return record;
+                }
             }
         }
         return kNone;
     }
 
 private:
+    // Records in input order, those before `next` taken already.
+    struct Queue {
+        std::vector<std::size_t> records;
+        std::size_t next = 0;
+    };
+    struct Users {
+        bool made = false;
+        std::unordered_map<std::string, Queue> byKey[2]; // exact, loose
+        Queue any;
+    };
+
     const PropStore& m_store;
     std::unordered_map<std::string, std::vector<std::size_t>> m_byWord;
+    std::unordered_map<std::string, Users> m_users;
     std::vector<bool> m_used;
 };
 
