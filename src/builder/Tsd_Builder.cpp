@@ -5,6 +5,7 @@
 #include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
+#include "internal/Tsd_StoredProps.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cctype>
@@ -122,7 +123,7 @@ void Tsd_Builder::setContext(const char16_t* context) {
 const char16_t* Tsd_Builder::getContext() const {
     if (m_contextFormat != nullptr) {
         std::unique_ptr<char16_t[]> context = translateMessage(
-            "TSDatabase", m_contextFormat, m_contextProp->name.get(), m_contextProp->value.get());
+            "TSDatabase", m_contextFormat, m_contextName, m_contextValue);
         m_contextFormat = nullptr;
         if (context == nullptr)
             m_context.clear();
@@ -147,12 +148,9 @@ void Tsd_Builder::addErrorCount(int n) {
 bool Tsd_Builder::addUserGroupProp(const char* name, const char* value) {
     if (name == nullptr)
         return false;
-    if (m_groupProps == nullptr) {
-        m_groupProps = std::make_unique<DARRAY_Tsd_PropPtr>();
-        m_groupProps->reserve(50);
-    }
-    m_groupProps->push_back(
-        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
+    if (m_groupProps == nullptr)
+        m_groupProps = std::make_unique<tsd_detail::StoredProps>();
+    m_groupProps->add(name, orEmpty(value));
     return true;
 }
 
@@ -164,12 +162,9 @@ bool Tsd_Builder::addSpecProp(const char* name, const char* value) {
                  startsWithNoCase(name, "TIMEGRP");
     if (!known)
         return false;
-    if (m_specProps == nullptr) {
-        m_specProps = std::make_unique<DARRAY_Tsd_PropPtr>();
-        m_specProps->reserve(50);
-    }
-    m_specProps->push_back(
-        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
+    if (m_specProps == nullptr)
+        m_specProps = std::make_unique<tsd_detail::StoredProps>();
+    m_specProps->add(name, orEmpty(value));
     return true;
 }
 
@@ -279,7 +274,11 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
     Tsd_Design& d = design();
     value = orEmpty(value);
     bool inDesign = false;
-    Tsd_UserGroup* group = findUnresolvedGroupByName(name);
+    const int placeholderSlot = findUnresolvedSlot(name);
+    const std::uint32_t unresolvedShape = tsd_detail::NameIndex::shapeOf(m_unresolvedGroups);
+    Tsd_UserGroup* group = placeholderSlot >= 0
+                               ? m_unresolvedGroups.getAt(placeholderSlot)->getUserGroup()
+                               : nullptr;
     if (group == nullptr) {
         Tsd_Group* found = d.findGroupByUserName(name, false);
         if (found != nullptr) {
@@ -302,8 +301,16 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
     bool defined = initUserGroupFromProp(group, value);
     if (!inDesign) {
         // A placeholder becomes the defined group itself, so groups that
-        // already include it keep pointing at the right object.
-        m_unresolvedGroups.removeObj(group);
+        // already include it keep pointing at the right object. Where the
+        // list kept its layout the placeholder still stands where it was
+        // found, as the first slot holding it; a new group stands nowhere.
+        if (placeholderSlot >= 0) {
+            if (tsd_detail::NameIndex::shapeOf(m_unresolvedGroups) == unresolvedShape &&
+                m_unresolvedGroups.getAt(placeholderSlot) == group)
+                m_unresolvedGroups.setAt(placeholderSlot, nullptr);
+            else
+                m_unresolvedGroups.removeObj(group);
+        }
         d.addGroup(group);
     }
     return defined ? group : nullptr;

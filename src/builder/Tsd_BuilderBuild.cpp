@@ -6,6 +6,7 @@
 #include "internal/Tsd_LinkGraph.h"
 #include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_Report.h"
+#include "internal/Tsd_StoredProps.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cstring>
@@ -189,19 +190,22 @@ Tsd_Design* Tsd_Builder::buildTSDesign() {
 }
 
 template <class Result>
-void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
+void Tsd_Builder::processStoredProps(std::unique_ptr<tsd_detail::StoredProps>& props,
                                      const char* context,
                                      Result (Tsd_Builder::*process)(const char*, const char*)) {
     if (props == nullptr)
         return;
     // Each message names the definition it comes from through the context.
-    for (std::unique_ptr<Tsd_Prop>& prop : *props) {
+    // The count is read anew: a hook may store more properties.
+    for (std::size_t i = 0; i < props->size(); ++i) {
+        const tsd_detail::StoredProps::Prop prop = props->at(i);
         // The context is made when a message first asks for it.
         m_contextFormat = context;
-        m_contextProp = prop.get();
-        (this->*process)(prop->name.get(), prop->value.get());
+        m_contextName = prop.name;
+        m_contextValue = prop.value;
+        (this->*process)(prop.name, prop.value);
         m_contextFormat = nullptr;
-        prop.reset();
+        props->releaseBefore(i + 1);
     }
     props.reset();
     setContext(nullptr);
