@@ -8,6 +8,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <memory>
 #include <stdexcept>
 #include <vector>
@@ -37,28 +38,69 @@ class Tsd_PathControl;
 class Tsd_PortTiming;
 
 // An owned copy of a zero-terminated string that may be null: the type of
-// every name, TSid, scope and similar text that an object keeps.
+// every name, TSid, scope and similar text that an object keeps. Texts of up
+// to 15 characters are held inside it, so get() points into the object and
+// lasts as long as it does (until it is set, assigned or moved from).
 class Tsd_String {
 public:
-    Tsd_String() = default;
-    explicit Tsd_String(const char* text) { set(text); }
-    Tsd_String(const Tsd_String& other) { set(other.get()); }
+    Tsd_String() { setNull(); }
+    explicit Tsd_String(const char* text) {
+        setNull();
+        set(text);
+    }
+    Tsd_String(const Tsd_String& other) {
+        setNull();
+        set(other.get());
+    }
     Tsd_String& operator=(const Tsd_String& other) {
         if (this != &other)
             set(other.get());
         return *this;
     }
-    Tsd_String(Tsd_String&&) noexcept = default;
-    Tsd_String& operator=(Tsd_String&&) noexcept = default;
+    Tsd_String(Tsd_String&& other) noexcept {
+        std::memcpy(m_bytes, other.m_bytes, sizeof m_bytes);
+        other.setNull();
+    }
+    Tsd_String& operator=(Tsd_String&& other) noexcept {
+        if (this != &other) {
+            release();
+            std::memcpy(m_bytes, other.m_bytes, sizeof m_bytes);
+            other.setNull();
+        }
+        return *this;
+    }
+    ~Tsd_String() { release(); }
 
     // Replaces the text by a copy of `text` (null stays null); `text` may
     // point into the current text.
     void set(const char* text);
-    const char* get() const { return m_text.get(); }
-    bool isNull() const { return m_text == nullptr; }
+    const char* get() const { return onHeap() ? heap() : reinterpret_cast<const char*>(m_bytes); }
+    bool isNull() const { return onHeap() && heap() == nullptr; }
 
 private:
-    std::unique_ptr<char[]> m_text;
+    // The last byte tells the two forms apart: a held text ends with a
+    // zero there (its terminator or its padding); kOnHeap marks a text held
+    // elsewhere, whose pointer (null for a null string) stands first.
+    static constexpr unsigned char kOnHeap = 0xFF;
+    static constexpr std::size_t kHeld = 15;
+
+    bool onHeap() const { return m_bytes[kHeld] == kOnHeap; }
+    char* heap() const {
+        char* p;
+        std::memcpy(&p, m_bytes, sizeof p);
+        return p;
+    }
+    void setHeap(char* p) {
+        std::memcpy(m_bytes, &p, sizeof p);
+        m_bytes[kHeld] = kOnHeap;
+    }
+    void setNull() { setHeap(nullptr); }
+    void release() {
+        if (onHeap())
+            delete[] heap();
+    }
+
+    alignas(char*) unsigned char m_bytes[kHeld + 1];
 };
 
 namespace tsd_detail {

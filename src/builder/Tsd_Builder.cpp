@@ -122,8 +122,8 @@ void Tsd_Builder::setContext(const char16_t* context) {
 
 const char16_t* Tsd_Builder::getContext() const {
     if (m_contextFormat != nullptr) {
-        std::unique_ptr<char16_t[]> context = translateMessage(
-            "TSDatabase", m_contextFormat, m_contextName, m_contextValue);
+        std::unique_ptr<char16_t[]> context =
+            translateMessage("TSDatabase", m_contextFormat, m_contextName, m_contextValue);
         m_contextFormat = nullptr;
         if (context == nullptr)
             m_context.clear();
@@ -276,9 +276,8 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
     bool inDesign = false;
     const int placeholderSlot = findUnresolvedSlot(name);
     const std::uint32_t unresolvedShape = tsd_detail::NameIndex::shapeOf(m_unresolvedGroups);
-    Tsd_UserGroup* group = placeholderSlot >= 0
-                               ? m_unresolvedGroups.getAt(placeholderSlot)->getUserGroup()
-                               : nullptr;
+    Tsd_UserGroup* group =
+        placeholderSlot >= 0 ? m_unresolvedGroups.getAt(placeholderSlot)->getUserGroup() : nullptr;
     if (group == nullptr) {
         Tsd_Group* found = d.findGroupByUserName(name, false);
         if (found != nullptr) {

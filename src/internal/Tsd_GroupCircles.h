@@ -27,9 +27,7 @@ public:
     bool isOnRoute(const Tsd_UserGroup* group) const { return state(group) == kOnRoute; }
     void enterRoute(const Tsd_UserGroup* group) { set(group, kOnRoute); }
     // Leaving the route, the group is recorded as free of circles or forgotten.
-    void leaveRoute(const Tsd_UserGroup* group, bool free) {
-        set(group, free ? kFree : kUnknown);
-    }
+    void leaveRoute(const Tsd_UserGroup* group, bool free) { set(group, free ? kFree : kUnknown); }
 
 private:
     static constexpr int kUnknown = 0;

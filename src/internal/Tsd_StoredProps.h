@@ -20,22 +20,22 @@ public:
     // Copies both texts (neither null).
     void add(const char* name, const char* value);
     std::size_t size() const { return m_props.size(); }
-    const Prop& at(std::size_t i) const { return m_props[i].prop; }
+    Prop at(std::size_t i) const;
     // Frees the texts of the properties before `i`; they must not be read
     // again.
     void releaseBefore(std::size_t i);
 
 private:
-    struct Entry {
-        Prop prop;
-        std::size_t block; // the block that holds both texts
+    struct Block {
+        std::unique_ptr<char[]> text;
+        std::size_t size;
     };
 
-    std::vector<Entry> m_props;
-    std::vector<std::unique_ptr<char[]>> m_blocks;
+    // Each property's name, its value right after it in the same block.
+    std::vector<const char*> m_props;
+    std::vector<Block> m_blocks;
     std::size_t m_released = 0; // blocks before it are freed
     std::size_t m_used = 0;     // bytes taken in the last block
-    std::size_t m_room = 0;     // bytes the last block holds
 };
 
 } // namespace tsd_detail
