@@ -126,6 +126,8 @@ private:
 
     // Moves obj from the active list to the trash; false if not active.
     static bool moveToTrash(ListPair& pair, Tsd_BaseObj* obj);
+    // The same for an obj known to stand first at `slot` of the active list.
+    static void moveToTrashAt(ListPair& pair, Tsd_BaseObj* obj, int slot);
     void dumpList(DumpStream& stream, short indent, const ListPair& pair) const;
 
     int trimRefObjs(ListPair& pair);

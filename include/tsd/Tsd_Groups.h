@@ -163,7 +163,7 @@ class Tsd_GroupRef;
 class Tsd_UserGroupIter;
 
 namespace tsd_detail {
-class CircleSearchState;
+class UserGroupMarks;
 } // namespace tsd_detail
 
 // A TIMEGRP definition: the union of its included members (each optionally
@@ -202,7 +202,7 @@ public:
 private:
     friend class Tsd_UserGroupIter;
     friend class Tsd_Design;
-    friend class tsd_detail::CircleSearchState;
+    friend class tsd_detail::UserGroupMarks;
 
     // One member entry; a removed entry keeps its place with a null member.
     struct Member {
@@ -239,9 +239,10 @@ private:
 
     MemberList m_includes;
     MemberList m_excludes;
-    // Where the current search for circular definitions stands with this
-    // group; read only through that search's state.
-    mutable std::uint64_t m_circleMark = 0;
+    // A number that a pass over many groups keeps here, tagged with that
+    // pass; read only through its holder.
+    mutable std::uint64_t m_markTag = 0;
+    mutable std::uint32_t m_markValue = 0;
 };
 
 using DARRAY_Tsd_UserGroupPtr = Tsd_DArray<Tsd_UserGroup>;

@@ -130,11 +130,17 @@ protected:
     const char* getDelayPropString() const;
 
 private:
+    friend class tsd_detail::LinkGraph;
+
     std::unique_ptr<Tsd_TimeValue> m_delay;
     std::unique_ptr<LinkData> m_link;
     std::int32_t m_priority;
     Tsd_TIGGroup* m_ignoreGroup;
     bool m_priorityWrittenAsNone = false;
+    // This spec's node in the link graph being built, tagged with that
+    // graph; read only through it.
+    mutable std::uint64_t m_graphTag = 0;
+    mutable std::int32_t m_graphNode = 0;
 };
 
 // "TS02*2", or with a separator "TS02 * 2"; null for a pending link.

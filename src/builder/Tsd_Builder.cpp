@@ -68,7 +68,8 @@ std::string caretLine(int column, int prefix, const std::string& written, const 
 bool hasOffsetKeyword(const char* value) {
     const size_t length = std::strlen(value);
     for (size_t i = 0; i + 6 <= length; ++i) {
-        if (!startsWithNoCase(value + i, "OFFSET"))
+        // Only an 'o' can begin the keyword: a cheap test before the full one.
+        if ((value[i] | 0x20) != 'o' || !startsWithNoCase(value + i, "OFFSET", 6))
             continue;
         if (i + 6 >= length)
             return false;

@@ -77,6 +77,11 @@ bool Tsd_Design::moveToTrash(ListPair& pair, Tsd_BaseObj* obj) {
     return true;
 }
 
+void Tsd_Design::moveToTrashAt(ListPair& pair, Tsd_BaseObj* obj, int slot) {
+    pair.active.setAt(slot, nullptr);
+    pair.trash.addObj(obj);
+}
+
 void Tsd_Design::addGroup(Tsd_Group* group) {
     m_groups.active.addObj(group);
 }

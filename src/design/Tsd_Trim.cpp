@@ -2,6 +2,7 @@
 // survivors from the trash, and listing the holders of a group.
 #include "tsd/Tsd_Design.h"
 
+#include "internal/Tsd_GroupCircles.h"
 #include "internal/Tsd_LinkGraph.h"
 #include "internal/Tsd_Report.h"
 
@@ -347,11 +348,15 @@ private:
 } // namespace
 
 int Tsd_Design::trimRefObjs(ListPair& pair) {
+    // Walking in list order, an object that goes has gone from every earlier
+    // slot too (the test gave the same answer there), so the slot it is met
+    // at is its first: it leaves from there without a search of the list.
     int count = 0;
-    Tsd_BaseObjListIter iter(&pair.active);
-    while (Tsd_BaseObj* obj = iter.next()) {
-        Tsd_RefList* refs = obj->getRefList();
-        if (refs != nullptr && refs->isEmpty() && moveToTrash(pair, obj)) {
+    for (int slot = 0; slot < pair.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = pair.active.getAt(slot);
+        Tsd_RefList* refs = obj != nullptr ? obj->getRefList() : nullptr;
+        if (refs != nullptr && refs->isEmpty()) {
+            moveToTrashAt(pair, obj, slot);
             reportObjTrashed(obj, TRIM_NO_REFERENCES);
             ++count;
         }
@@ -393,18 +398,27 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         if (Tsd_UserGroup* group = obj != nullptr ? obj->getUserGroup() : nullptr)
             nodes.push_back({group, slot, 0});
     }
+    // Each listed user group's node, found from the group: through the
+    // groups' marks, or else by address in a sorted table.
+    tsd_detail::UserGroupMarks marks;
     std::vector<std::pair<const Tsd_BaseObj*, int>> byAddress;
-    byAddress.reserve(nodes.size());
-    for (std::size_t k = 0; k < nodes.size(); ++k)
-        byAddress.emplace_back(nodes[k].group, static_cast<int>(k));
-    std::sort(byAddress.begin(), byAddress.end(),
-              [](const auto& a, const auto& b) { return std::less<>()(a.first, b.first); });
-
     // A group listed twice is met by the passes at two places: such a design
     // is trimmed pass by pass.
     bool plain = true;
-    for (std::size_t k = 1; k < byAddress.size() && plain; ++k)
-        plain = byAddress[k].first != byAddress[k - 1].first;
+    if (marks.held()) {
+        for (std::size_t k = 0; k < nodes.size() && plain; ++k) {
+            plain = marks.get(nodes[k].group) < 0;
+            marks.set(nodes[k].group, static_cast<std::uint32_t>(k));
+        }
+    } else {
+        byAddress.reserve(nodes.size());
+        for (std::size_t k = 0; k < nodes.size(); ++k)
+            byAddress.emplace_back(nodes[k].group, static_cast<int>(k));
+        std::sort(byAddress.begin(), byAddress.end(),
+                  [](const auto& a, const auto& b) { return std::less<>()(a.first, b.first); });
+        for (std::size_t k = 1; k < byAddress.size() && plain; ++k)
+            plain = byAddress[k].first != byAddress[k - 1].first;
+    }
     if (!plain) {
         int count = 0;
         for (int n = trimUserGroups(); n != 0; n = trimUserGroups())
@@ -412,7 +426,12 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         return count;
     }
 
-    auto nodeOf = [&](const Tsd_BaseObj* obj) {
+    auto nodeOf = [&](Tsd_PredefGroup* member) -> int {
+        if (marks.held()) {
+            const Tsd_UserGroup* user = member->getUserGroup();
+            return user != nullptr ? static_cast<int>(marks.get(user)) : -1;
+        }
+        const Tsd_BaseObj* obj = member;
         auto it = std::lower_bound(
             byAddress.begin(), byAddress.end(), obj,
             [](const auto& entry, const Tsd_BaseObj* p) { return std::less<>()(entry.first, p); });
@@ -465,7 +484,10 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         const Node& node = nodes[static_cast<std::size_t>(events.top().second)];
         const int k = events.top().second;
         events.pop();
-        if (!moveToTrash(m_groups, node.group))
+        // Listed once, a group still at its slot stands first there.
+        if (active.getAt(node.slot) == node.group)
+            moveToTrashAt(m_groups, node.group, node.slot);
+        else if (!moveToTrash(m_groups, node.group))
             continue;
         reportObjTrashed(node.group, TRIM_EMPTY_USER_GROUP);
         ++count;

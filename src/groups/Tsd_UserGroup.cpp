@@ -205,35 +205,35 @@ void reportCircle(const std::vector<Frame>& route) {
 
 namespace {
 
-std::uint64_t g_lastSearch = 0;
+std::uint64_t g_lastTag = 0;
 bool g_marksTaken = false;
 
 } // namespace
 
-tsd_detail::CircleSearchState::CircleSearchState() {
+tsd_detail::UserGroupMarks::UserGroupMarks() {
     if (!g_marksTaken) {
         g_marksTaken = true;
-        m_search = ++g_lastSearch;
+        m_tag = ++g_lastTag;
     }
 }
 
-tsd_detail::CircleSearchState::~CircleSearchState() {
-    if (m_search != 0)
+tsd_detail::UserGroupMarks::~UserGroupMarks() {
+    if (m_tag != 0)
         g_marksTaken = false;
 }
 
 int tsd_detail::CircleSearchState::state(const Tsd_UserGroup* group) const {
-    if (m_search == 0) {
+    if (!m_marks.held()) {
         const int slot = m_table.first(group);
         return slot < 0 ? kUnknown : slot;
     }
-    const std::uint64_t mark = group->m_circleMark;
-    return (mark >> 2) == m_search ? static_cast<int>(mark & 3u) : kUnknown;
+    const std::int64_t mark = m_marks.get(group);
+    return mark < 0 ? kUnknown : static_cast<int>(mark);
 }
 
 void tsd_detail::CircleSearchState::set(const Tsd_UserGroup* group, int state) {
-    if (m_search != 0) {
-        group->m_circleMark = (m_search << 2) | static_cast<std::uint64_t>(state);
+    if (m_marks.held()) {
+        m_marks.set(group, static_cast<std::uint32_t>(state));
         return;
     }
     // A group enters the route from the unknown state only.

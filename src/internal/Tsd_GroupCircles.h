@@ -8,21 +8,39 @@
 
 namespace tsd_detail {
 
+// A number kept on each user group for a pass over many groups, so the pass
+// needs no table keyed by group. One holder at a time owns the marks: a
+// pass that finds them taken (held() false) must keep its own table.
+class UserGroupMarks {
+public:
+    UserGroupMarks();
+    ~UserGroupMarks();
+    UserGroupMarks(const UserGroupMarks&) = delete;
+    UserGroupMarks& operator=(const UserGroupMarks&) = delete;
+
+    bool held() const { return m_tag != 0; }
+    // What this holder set on `group`, or -1; only while held.
+    std::int64_t get(const Tsd_UserGroup* group) const {
+        return group->m_markTag == m_tag ? static_cast<std::int64_t>(group->m_markValue) : -1;
+    }
+    void set(const Tsd_UserGroup* group, std::uint32_t value) const {
+        group->m_markTag = m_tag;
+        group->m_markValue = value;
+    }
+
+private:
+    std::uint64_t m_tag = 0; // tells this holder's marks from older ones
+};
+
 // What searches over unchanged definitions know about user groups: which are
 // on the route of the current search, and which reach no circular definition
 // at all. The latter depends only on the definitions, not on where a search
 // began, so one record serves every search of a validation.
 //
-// The state lives in the groups themselves, tagged with the search it belongs
-// to, so a search a million groups deep needs no table. A search started
-// while another one holds the groups' marks keeps its state in a table.
+// The state lives in the groups' marks, so a search a million groups deep
+// needs no table; only a search that finds the marks taken keeps a table.
 class CircleSearchState {
 public:
-    CircleSearchState();
-    ~CircleSearchState();
-    CircleSearchState(const CircleSearchState&) = delete;
-    CircleSearchState& operator=(const CircleSearchState&) = delete;
-
     bool isFree(const Tsd_UserGroup* group) const { return state(group) == kFree; }
     bool isOnRoute(const Tsd_UserGroup* group) const { return state(group) == kOnRoute; }
     void enterRoute(const Tsd_UserGroup* group) { set(group, kOnRoute); }
@@ -37,8 +55,8 @@ private:
     int state(const Tsd_UserGroup* group) const;
     void set(const Tsd_UserGroup* group, int state);
 
-    std::uint64_t m_search = 0; // this search's tag, or 0 when it uses the table
-    Tsd_SlotIndex m_table;      // each group's state stands where a slot would
+    UserGroupMarks m_marks;
+    Tsd_SlotIndex m_table; // without the marks: each group's state stands where a slot would
 };
 
 // What checkInExcludes(report) counts and reports for `start`, skipping the

@@ -26,6 +26,9 @@ void noteNameChange() {
 }
 
 bool NameIndex::liveHead(const Tsd_BaseObjList& list, Bucket& bucket) {
+    // Most heads were never cleared: the chain's tail is not even read.
+    if (list.getAt(bucket.head) != nullptr)
+        return true;
     const std::int32_t tail = m_tail[static_cast<std::size_t>(bucket.head)];
     while (bucket.head >= 0 && list.getAt(bucket.head) == nullptr)
         bucket.head = m_next[static_cast<std::size_t>(bucket.head)];

@@ -85,14 +85,22 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
     return value;
 }
 
+// A value already held is overwritten in place: resolving a million links
+// then allocates nothing.
 void Tsd_EndpointSpec::setDelayValue(const Tsd_TimeValue& delay) {
     m_link.reset();
-    m_delay = std::make_unique<Tsd_TimeValue>(delay);
+    if (m_delay != nullptr)
+        *m_delay = delay;
+    else
+        m_delay = std::make_unique<Tsd_TimeValue>(delay);
 }
 
 void Tsd_EndpointSpec::setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor) {
     m_delay.reset();
-    m_link = std::make_unique<LinkData>(LinkData{spec, multiply, factor});
+    if (m_link != nullptr)
+        *m_link = LinkData{spec, multiply, factor};
+    else
+        m_link = std::make_unique<LinkData>(LinkData{spec, multiply, factor});
 }
 
 Tsd_EndpointSpec* Tsd_EndpointSpec::getLinkedSpec() const {
