@@ -238,7 +238,7 @@ private:
     void removeMembers(const std::vector<const Tsd_PredefGroup*>& members, bool exclude);
 
     MemberList m_includes;
-    MemberList m_excludes;
+    std::unique_ptr<MemberList> m_excludes; // made by the first exclusion
     // A number that a pass over many groups keeps here, tagged with that
     // pass; read only through its holder.
     mutable std::uint64_t m_markTag = 0;

@@ -11,7 +11,9 @@
 #include <cctype>
 #include <climits>
 #include <cstring>
+#include <initializer_list>
 #include <string>
+#include <string_view>
 
 using tsd_detail::equalsNoCase;
 using tsd_detail::orEmpty;
@@ -39,6 +41,19 @@ bool oneOf(const char* name, const char* const (&names)[N]) {
         if (equalsNoCase(name, candidate))
             return true;
     return false;
+}
+
+// The texts one after the other, in one allocation: every property the
+// build parses is put together this way.
+std::string joined(std::initializer_list<std::string_view> parts) {
+    std::size_t size = 0;
+    for (std::string_view part : parts)
+        size += part.size();
+    std::string text;
+    text.reserve(size);
+    for (std::string_view part : parts)
+        text.append(part.data(), part.size());
+    return text;
 }
 
 // A defined name as the parser must see it: written as every name in
@@ -319,7 +334,7 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
 bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value) {
     const char* name = orEmpty(group->getName());
     const std::string written = nameForText(name);
-    std::string text = "TIMEGRP " + written + "=" + value + " ;";
+    const std::string text = joined({"TIMEGRP ", written, "=", value, " ;"});
     m_specGroupParser->setNewGroup(group);
     m_specGroupParser->clearError();
     if (m_specGroupParser->parse(text.c_str())) {
@@ -405,15 +420,15 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
     std::string written = name;
     if (equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
         equalsNoCase(name, "DISABLE")) {
-        text = std::string(name) + "=" + value + " ;";
+        text = joined({name, "=", value, " ;"});
         prefix = 1;
     } else if (startsWithNoCase(name, "TS") && hasOffsetKeyword(value)) {
-        text = std::string(value) + " ;";
+        text = joined({value, " ;"});
         prefix = 1;
         shift = static_cast<int>(std::strlen(name)) + 1;
     } else {
         written = nameForText(name);
-        text = "TIMESPEC " + written + "=" + value + " ;";
+        text = joined({"TIMESPEC ", written, "=", value, " ;"});
         prefix = 10;
     }
     m_specGroupParser->clearError();
@@ -455,7 +470,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
 Tsd_Spec* Tsd_Builder::buildNetSpecFromProp(const char* name, const char* value) {
     if (!oneOf(name, kNetRefProps))
         TSD_MSG().fatal(2, "Non net-spec prop %s=%s\n", name, value);
-    std::string text = std::string(name + 3) + "=" + value + " ;";
+    const std::string text = joined({name + 3, "=", value, " ;"});
     m_netParser->clearError();
     m_netParser->setNewSpec(nullptr);
     m_pendingRegGroupName.set(nullptr);

@@ -89,17 +89,19 @@ void Tsd_UserGroup::addGroup(Tsd_PredefGroup* group, Edge edge, bool exclude) {
     // A null member marks a removed entry.
     if (group == nullptr)
         return;
-    (exclude ? m_excludes : m_includes).append(Member{group, edge});
+    if (exclude && m_excludes == nullptr)
+        m_excludes = std::make_unique<MemberList>();
+    (exclude ? *m_excludes : m_includes).append(Member{group, edge});
 }
 
 bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
-    if (group == nullptr)
+    MemberList* list = exclude ? m_excludes.get() : &m_includes;
+    if (group == nullptr || list == nullptr)
         return false;
-    MemberList& list = exclude ? m_excludes : m_includes;
     bool removed = false;
-    for (std::int32_t i = 0; i < list.count(); ++i) {
-        if (list.at(i).group == group) {
-            list.at(i).group = nullptr;
+    for (std::int32_t i = 0; i < list->count(); ++i) {
+        if (list->at(i).group == group) {
+            list->at(i).group = nullptr;
             removed = true;
         }
     }
@@ -108,9 +110,9 @@ bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
 
 void Tsd_UserGroup::removeMembers(const std::vector<const Tsd_PredefGroup*>& members,
                                   bool exclude) {
-    MemberList& list = exclude ? m_excludes : m_includes;
-    for (std::int32_t i = 0; i < list.count(); ++i) {
-        Member& entry = list.at(i);
+    MemberList* list = exclude ? m_excludes.get() : &m_includes;
+    for (std::int32_t i = 0; list != nullptr && i < list->count(); ++i) {
+        Member& entry = list->at(i);
         if (entry.group != nullptr &&
             std::binary_search(members.begin(), members.end(), entry.group,
                                std::less<const Tsd_PredefGroup*>()))
@@ -120,7 +122,7 @@ void Tsd_UserGroup::removeMembers(const std::vector<const Tsd_PredefGroup*>& mem
 
 void Tsd_UserGroup::clearDef() {
     m_includes.clear();
-    m_excludes.clear();
+    m_excludes.reset();
 }
 
 bool Tsd_UserGroup::getProp(const char*& name, const char*& value) const {
@@ -166,27 +168,12 @@ void Tsd_UserGroup::dump(DumpStream& stream, short indent) const {
 namespace {
 
 // One user group on the current route of the circular-definition walk, and
-// how far its members have been walked: included members first, then
-// excluded ones.
+// how far its members have been walked, included members first, then
+// excluded ones: sixteen bytes, for routes a million groups deep.
 struct Frame {
     Tsd_UserGroup* group;
-    Tsd_UserGroupIter members;
-    bool inExcludes;
-    int countOnEntry;
-
-    Frame(Tsd_UserGroup* g, int count)
-        : group(g), members(g, false), inExcludes(false), countOnEntry(count) {}
-
-    Tsd_PredefGroup* nextMember() {
-        Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
-        Tsd_PredefGroup* member = members.next(edge);
-        if (member == nullptr && !inExcludes) {
-            inExcludes = true;
-            members = Tsd_UserGroupIter(group, true);
-            member = members.next(edge);
-        }
-        return member;
-    }
+    std::int32_t position;
+    std::int32_t countOnEntry;
 };
 
 void reportCircle(const std::vector<Frame>& route) {
@@ -220,6 +207,23 @@ tsd_detail::UserGroupMarks::UserGroupMarks() {
 tsd_detail::UserGroupMarks::~UserGroupMarks() {
     if (m_tag != 0)
         g_marksTaken = false;
+}
+
+Tsd_PredefGroup* tsd_detail::UserGroupMarks::nextMember(const Tsd_UserGroup* group,
+                                                        std::int32_t& position) {
+    const Tsd_UserGroup::MemberList& includes = group->m_includes;
+    for (; position < includes.count(); ++position)
+        if (Tsd_PredefGroup* member = includes.at(position).group) {
+            ++position;
+            return member;
+        }
+    const Tsd_UserGroup::MemberList* excludes = group->m_excludes.get();
+    for (; excludes != nullptr && position - includes.count() < excludes->count(); ++position)
+        if (Tsd_PredefGroup* member = excludes->at(position - includes.count()).group) {
+            ++position;
+            return member;
+        }
+    return nullptr;
 }
 
 int tsd_detail::CircleSearchState::state(const Tsd_UserGroup* group) const {
@@ -256,10 +260,11 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchStat
         return 0;
     int count = 0;
     std::vector<Frame> route;
-    route.emplace_back(start, count);
+    route.push_back(Frame{start, 0, count});
     state.enterRoute(start);
     while (!route.empty()) {
-        Tsd_PredefGroup* member = route.back().nextMember();
+        Tsd_PredefGroup* member =
+            UserGroupMarks::nextMember(route.back().group, route.back().position);
         if (member == nullptr) {
             state.leaveRoute(route.back().group, count == route.back().countOnEntry);
             route.pop_back();
@@ -274,7 +279,7 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchStat
                 reportCircle(route);
             continue;
         }
-        route.emplace_back(user, count);
+        route.push_back(Frame{user, 0, count});
         state.enterRoute(user);
     }
     return count;
@@ -289,7 +294,7 @@ int Tsd_UserGroup::checkInExcludes(bool report) {
 
 Tsd_UserGroupIter::Tsd_UserGroupIter(const Tsd_UserGroup* group, bool excludes)
     : m_list(group == nullptr ? nullptr
-             : excludes       ? &group->m_excludes
+             : excludes       ? group->m_excludes.get()
                               : &group->m_includes) {}
 
 Tsd_PredefGroup* Tsd_UserGroupIter::next(Tsd_UserGroup::Edge& edge) {

@@ -28,6 +28,11 @@ public:
         group->m_markValue = value;
     }
 
+    // The member at or after `position` of the group's included members,
+    // then of its excluded ones, counted as one sequence; `position` moves
+    // past it. Null at the end. A walk kept in one number per group.
+    static Tsd_PredefGroup* nextMember(const Tsd_UserGroup* group, std::int32_t& position);
+
 private:
     std::uint64_t m_tag = 0; // tells this holder's marks from older ones
 };
