@@ -150,12 +150,13 @@ private:
     mutable std::unique_ptr<tsd_detail::NameIndex> m_unresolvedIndex;
     std::unique_ptr<tsd_detail::StoredProps> m_specProps;
     std::unique_ptr<tsd_detail::StoredProps> m_groupProps;
-    DARRAY_Tsd_PendPtr m_pendingLinks;
+    // Pending records by value; a consumed one keeps its place with no spec.
+    std::vector<Tsd_Pend> m_pendingLinks;
     // Where each spec's pending link record stands in m_pendingLinks; made
     // when a record other than the newest is first dropped.
     std::unique_ptr<Tsd_SlotIndex> m_pendingLinkSlot;
     Tsd_String m_pendingLinkTSid;
-    DARRAY_Tsd_PendPtr m_pendingRegGroups;
+    std::vector<Tsd_Pend> m_pendingRegGroups;
     Tsd_String m_pendingRegGroupName;
     bool m_built = false;
 };

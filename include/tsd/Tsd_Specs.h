@@ -7,6 +7,7 @@
 #include "tsd/Tsd_Groups.h"
 
 #include <memory>
+#include <optional>
 
 // A number and its unit. Every time quantity of the specifications is one;
 // conversions go through picoseconds, and frequency units convert to times by
@@ -87,14 +88,14 @@ public:
     // The effective delay, following the link chain. Only for specs whose
     // checkLink() is 0; a broken chain is a fatal message.
     Tsd_TimeValue getDelayValue() const;
-    bool hasDelayValue() const { return m_delay != nullptr; }
+    bool hasDelayValue() const { return m_delay.has_value(); }
     void setDelayValue(const Tsd_TimeValue& delay);
     void setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor);
-    bool isLinked() const { return m_link != nullptr; }
+    bool isLinked() const { return m_link.has_value(); }
     Tsd_EndpointSpec* getLinkedSpec() const;
     bool isLinkMultiplied() const;
     double getLinkFactor() const;
-    const LinkData* getLinkData() const { return m_link.get(); }
+    const LinkData* getLinkData() const { return m_link ? &*m_link : nullptr; }
 
     bool hasPriority() const { return m_priority != -1; }
     int getPriority() const { return m_priority; }
@@ -132,8 +133,9 @@ protected:
 private:
     friend class tsd_detail::LinkGraph;
 
-    std::unique_ptr<Tsd_TimeValue> m_delay;
-    std::unique_ptr<LinkData> m_link;
+    // Held in the spec: every spec has one or the other.
+    std::optional<Tsd_TimeValue> m_delay;
+    std::optional<LinkData> m_link;
     std::int32_t m_priority;
     Tsd_TIGGroup* m_ignoreGroup;
     bool m_priorityWrittenAsNone = false;

@@ -389,24 +389,23 @@ void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec, bool newest) {
     // cleared entries, and the positions of the others stay valid.
     if (newest) {
         // Its record, if any, is the last one made.
-        if (!m_pendingLinks.empty() && m_pendingLinks.back() != nullptr &&
-            m_pendingLinks.back()->spec == spec) {
+        if (!m_pendingLinks.empty() && m_pendingLinks.back().spec == spec) {
             if (m_pendingLinkSlot != nullptr)
                 m_pendingLinkSlot->remove(spec, static_cast<int>(m_pendingLinks.size() - 1));
-            m_pendingLinks.back().reset();
+            m_pendingLinks.back() = Tsd_Pend();
         }
         return;
     }
     if (m_pendingLinkSlot == nullptr) {
         m_pendingLinkSlot = std::make_unique<Tsd_SlotIndex>();
         for (std::size_t i = 0; i < m_pendingLinks.size(); ++i)
-            if (m_pendingLinks[i] != nullptr)
-                m_pendingLinkSlot->add(m_pendingLinks[i]->spec, static_cast<int>(i));
+            if (m_pendingLinks[i].spec != nullptr)
+                m_pendingLinkSlot->add(m_pendingLinks[i].spec, static_cast<int>(i));
     }
     const int slot = m_pendingLinkSlot->first(spec);
     if (slot < 0)
         return;
-    m_pendingLinks[static_cast<std::size_t>(slot)].reset();
+    m_pendingLinks[static_cast<std::size_t>(slot)] = Tsd_Pend();
     m_pendingLinkSlot->remove(spec, slot);
 }
 
@@ -461,7 +460,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
         if (m_pendingLinkSlot != nullptr)
             m_pendingLinkSlot->add(endpoint, static_cast<int>(m_pendingLinks.size()));
-        m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
+        m_pendingLinks.push_back(Tsd_Pend{m_pendingLinkTSid, endpoint});
         m_pendingLinkTSid.set(nullptr);
     }
     return spec.release();
@@ -492,8 +491,7 @@ Tsd_Spec* Tsd_Builder::buildNetSpecFromProp(const char* name, const char* value)
         Tsd_NetOffset* offset = spec->getNetOffset();
         if (offset == nullptr)
             TSD_MSG().fatal(2, "Non-net offset spec has pending reg group!\n");
-        m_pendingRegGroups.push_back(
-            std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingRegGroupName, offset}));
+        m_pendingRegGroups.push_back(Tsd_Pend{m_pendingRegGroupName, offset});
         m_pendingRegGroupName.set(nullptr);
     }
     return spec.release();

@@ -52,7 +52,7 @@ private:
     // Skips the cleared slots at the head of a chain; false when none is left.
     bool liveHead(const Tsd_BaseObjList& list, Bucket& bucket);
     bool headMatches(const Tsd_BaseObjList& list, const Bucket& bucket, const char* key) const;
-    void rehash();
+    void rehash(const Tsd_BaseObjList& list);
 
     KeyOf m_keyOf;
     bool m_built = false;

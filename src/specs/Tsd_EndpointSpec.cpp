@@ -39,13 +39,8 @@ Tsd_EndpointSpec::Tsd_EndpointSpec(const char* tsid)
 }
 
 Tsd_EndpointSpec::Tsd_EndpointSpec(const Tsd_EndpointSpec& other)
-    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup),
-      m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {
-    if (other.m_delay != nullptr)
-        m_delay = std::make_unique<Tsd_TimeValue>(*other.m_delay);
-    if (other.m_link != nullptr)
-        m_link = std::make_unique<LinkData>(*other.m_link);
-}
+    : Tsd_Spec(other), m_delay(other.m_delay), m_link(other.m_link), m_priority(other.m_priority),
+      m_ignoreGroup(other.m_ignoreGroup), m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {}
 
 Tsd_EndpointSpec::~Tsd_EndpointSpec() = default;
 
@@ -60,8 +55,8 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
     std::vector<const Tsd_EndpointSpec*> chain;
     std::unordered_set<const Tsd_EndpointSpec*> seen;
     const Tsd_EndpointSpec* current = this;
-    while (current->m_delay == nullptr) {
-        if (current->m_link == nullptr || current->m_link->spec == nullptr)
+    while (!current->m_delay) {
+        if (!current->m_link || current->m_link->spec == nullptr)
             TSD_MSG().fatal(2, "Unresolved link or ignored spec in getDelayValue() on spec %s\n",
                             current->getTSid());
         if (!seen.insert(current).second)
@@ -85,38 +80,30 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
     return value;
 }
 
-// A value already held is overwritten in place: resolving a million links
-// then allocates nothing.
 void Tsd_EndpointSpec::setDelayValue(const Tsd_TimeValue& delay) {
     m_link.reset();
-    if (m_delay != nullptr)
-        *m_delay = delay;
-    else
-        m_delay = std::make_unique<Tsd_TimeValue>(delay);
+    m_delay = delay;
 }
 
 void Tsd_EndpointSpec::setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor) {
     m_delay.reset();
-    if (m_link != nullptr)
-        *m_link = LinkData{spec, multiply, factor};
-    else
-        m_link = std::make_unique<LinkData>(LinkData{spec, multiply, factor});
+    m_link = LinkData{spec, multiply, factor};
 }
 
 Tsd_EndpointSpec* Tsd_EndpointSpec::getLinkedSpec() const {
-    return m_link != nullptr ? m_link->spec : nullptr;
+    return m_link.has_value() ? m_link->spec : nullptr;
 }
 
 bool Tsd_EndpointSpec::isLinkMultiplied() const {
-    return m_link != nullptr && m_link->multiply;
+    return m_link.has_value() && m_link->multiply;
 }
 
 double Tsd_EndpointSpec::getLinkFactor() const {
-    return m_link != nullptr ? m_link->factor : 0.0;
+    return m_link.has_value() ? m_link->factor : 0.0;
 }
 
 int Tsd_EndpointSpec::checkLink(bool report) const {
-    if (m_delay != nullptr)
+    if (m_delay.has_value())
         return 0;
     int count = 0;
     Tsd_BaseObjList visited(10); // in the order visited, for the listing
@@ -130,7 +117,7 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
                 tsd_detail::reportIgnoredLink(this, current);
             return count + 1;
         }
-        const LinkData* link = current->m_link.get();
+        const LinkData* link = current->getLinkData();
         if (link == nullptr || link->spec == nullptr)
             TSD_MSG().fatal(2, "NULL link in spec %s.\n", current->getTSid());
         // The list only records addresses; nothing is changed through it.
@@ -151,25 +138,25 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
                 while (Tsd_BaseObj* obj = iter.next()) {
                     const Tsd_EndpointSpec* spec = obj->getEndpointSpec();
                     msg.status("   %s is defined as %s\n", spec->getTSid(),
-                               formatLink(spec->m_link.get(), " "));
+                               formatLink(spec->getLinkData(), " "));
                 }
             }
             return count + 1;
         }
         current = link->spec;
-        if (current->m_delay != nullptr)
+        if (current->m_delay.has_value())
             return count;
     }
 }
 
 const char* Tsd_EndpointSpec::getDelayPropString() const {
     static Tsd_StaticBuf buffer(16, 8);
-    if (m_delay != nullptr) {
+    if (m_delay.has_value()) {
         buffer.copy(m_delay->getString(":"));
-    } else if (m_link != nullptr) {
+    } else if (m_link.has_value()) {
         // A pending link writes nothing; a TSid that would not read back as
         // a link is quoted.
-        const char* text = formatLink(m_link.get(), "");
+        const char* text = formatLink(getLinkData(), "");
         if (text == nullptr) {
             buffer.clear();
         } else {
@@ -187,15 +174,15 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
 
 void Tsd_EndpointSpec::dump(DumpStream& stream, short indent) const {
     dumpLine(stream, indent, std::string("Tsd_EndpointSpec ") + orEmpty(getTSid()));
-    if (m_delay != nullptr)
+    if (m_delay.has_value())
         dumpLine(stream, indent, "   delay: " + tsd_detail::dumpTime(*m_delay));
     else
         dumpLine(stream, indent, "   delay unset");
-    if (m_link == nullptr) {
+    if (!m_link) {
         dumpLine(stream, indent, "   link unset");
     } else {
         // A pending link, or one to a spec without TSid, has no text.
-        const char* text = formatLink(m_link.get(), "");
+        const char* text = formatLink(getLinkData(), "");
         dumpLine(stream, indent,
                  text != nullptr ? std::string("   link: ") + text
                                  : std::string("   link with NULL TSid pointer"));
