@@ -514,9 +514,13 @@ bool Tsd_Design::trim() {
     // empty another that was walked before it.
     count += trimUserGroupsToTheEnd();
 
-    // 3. Endpoint specs whose groups are gone.
-    Tsd_BaseObjListIter specs(&m_endpointSpecs.active);
-    while (Tsd_BaseObj* obj = specs.next()) {
+    // 3. Endpoint specs whose groups are gone. Here and in steps 5 and 6 a
+    // spec that goes stands first at the slot it is met at, as in
+    // trimRefObjs.
+    for (int slot = 0; slot < m_endpointSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_endpointSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         TrimReason reason = TRIM_NONE;
         if (Tsd_DelayPath* path = obj->getDelayPath()) {
             if (path->getStart() != nullptr && isGroupTrashed(path->getStart()))
@@ -536,7 +540,8 @@ bool Tsd_Design::trim() {
             if (period->getPeriodGroup() != nullptr && isGroupTrashed(period->getPeriodGroup()))
                 reason = TRIM_PERIOD_GROUP;
         }
-        if (reason != TRIM_NONE && moveToTrash(m_endpointSpecs, obj)) {
+        if (reason != TRIM_NONE) {
+            moveToTrashAt(m_endpointSpecs, obj, slot);
             reportObjTrashed(obj, reason);
             ++count;
         }
@@ -556,8 +561,10 @@ bool Tsd_Design::trim() {
     }
 
     // 5. Offsets whose clock, reference pin, register or pad group is gone.
-    Tsd_BaseObjListIter offsets(&m_offsetSpecs.active);
-    while (Tsd_BaseObj* obj = offsets.next()) {
+    for (int slot = 0; slot < m_offsetSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_offsetSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_Offset* offset = obj->getOffset();
         if (offset == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
@@ -573,20 +580,24 @@ bool Tsd_Design::trim() {
         else if (groupOffset != nullptr && groupOffset->getPadGroup() != nullptr &&
                  isGroupTrashed(groupOffset->getPadGroup()))
             reason = TRIM_PAD_GROUP;
-        if (reason != TRIM_NONE && moveToTrash(m_offsetSpecs, obj)) {
+        if (reason != TRIM_NONE) {
+            moveToTrashAt(m_offsetSpecs, obj, slot);
             reportObjTrashed(obj, reason);
             ++count;
         }
     }
 
     // 6. Port timings whose secondary group is gone.
-    Tsd_BaseObjListIter ports(&m_portSpecs.active);
-    while (Tsd_BaseObj* obj = ports.next()) {
+    for (int slot = 0; slot < m_portSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_portSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_PortTiming* port = obj->getPortTiming();
         if (port == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
         if (port->getSecondaryGroup() != nullptr &&
-            isClockGroupTrashed(port->getSecondaryGroup()) && moveToTrash(m_portSpecs, obj)) {
+            isClockGroupTrashed(port->getSecondaryGroup())) {
+            moveToTrashAt(m_portSpecs, obj, slot);
             reportObjTrashed(obj, TRIM_CLOCK_GROUP);
             ++count;
         }
