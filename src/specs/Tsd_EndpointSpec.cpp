@@ -39,7 +39,7 @@ Tsd_EndpointSpec::Tsd_EndpointSpec(const char* tsid)
 }
 
 Tsd_EndpointSpec::Tsd_EndpointSpec(const Tsd_EndpointSpec& other)
-    : Tsd_Spec(other), m_delay(other.m_delay), m_link(other.m_link), m_priority(other.m_priority),
+    : Tsd_Spec(other), m_delayOrLink(other.m_delayOrLink), m_priority(other.m_priority),
       m_ignoreGroup(other.m_ignoreGroup), m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {}
 
 Tsd_EndpointSpec::~Tsd_EndpointSpec() = default;
@@ -55,20 +55,20 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
     std::vector<const Tsd_EndpointSpec*> chain;
     std::unordered_set<const Tsd_EndpointSpec*> seen;
     const Tsd_EndpointSpec* current = this;
-    while (!current->m_delay) {
-        if (!current->m_link || current->m_link->spec == nullptr)
+    while (current->delay() == nullptr) {
+        if (current->link() == nullptr || current->link()->spec == nullptr)
             TSD_MSG().fatal(2, "Unresolved link or ignored spec in getDelayValue() on spec %s\n",
                             current->getTSid());
         if (!seen.insert(current).second)
             TSD_MSG().fatal(2, "Circular TSid link in getDelayValue() on spec %s\n", getTSid());
         chain.push_back(current);
-        current = current->m_link->spec;
+        current = current->link()->spec;
     }
     // Apply the links from the end of the chain back to this spec, as the
     // value is defined: each spec scales the value of the one it links to.
-    Tsd_TimeValue value = *current->m_delay;
+    Tsd_TimeValue value = *current->delay();
     for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
-        const LinkData& link = *(*it)->m_link;
+        const LinkData& link = *(*it)->link();
         if (link.multiply) {
             value.value *= link.factor;
         } else {
@@ -81,29 +81,27 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
 }
 
 void Tsd_EndpointSpec::setDelayValue(const Tsd_TimeValue& delay) {
-    m_link.reset();
-    m_delay = delay;
+    m_delayOrLink = delay;
 }
 
 void Tsd_EndpointSpec::setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor) {
-    m_delay.reset();
-    m_link = LinkData{spec, multiply, factor};
+    m_delayOrLink = LinkData{spec, multiply, factor};
 }
 
 Tsd_EndpointSpec* Tsd_EndpointSpec::getLinkedSpec() const {
-    return m_link.has_value() ? m_link->spec : nullptr;
+    return link() != nullptr ? link()->spec : nullptr;
 }
 
 bool Tsd_EndpointSpec::isLinkMultiplied() const {
-    return m_link.has_value() && m_link->multiply;
+    return link() != nullptr && link()->multiply;
 }
 
 double Tsd_EndpointSpec::getLinkFactor() const {
-    return m_link.has_value() ? m_link->factor : 0.0;
+    return link() != nullptr ? link()->factor : 0.0;
 }
 
 int Tsd_EndpointSpec::checkLink(bool report) const {
-    if (m_delay.has_value())
+    if (delay() != nullptr)
         return 0;
     int count = 0;
     Tsd_BaseObjList visited(10); // in the order visited, for the listing
@@ -144,16 +142,16 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
             return count + 1;
         }
         current = link->spec;
-        if (current->m_delay.has_value())
+        if (current->delay() != nullptr)
             return count;
     }
 }
 
 const char* Tsd_EndpointSpec::getDelayPropString() const {
     static Tsd_StaticBuf buffer(16, 8);
-    if (m_delay.has_value()) {
-        buffer.copy(m_delay->getString(":"));
-    } else if (m_link.has_value()) {
+    if (delay() != nullptr) {
+        buffer.copy(delay()->getString(":"));
+    } else if (link() != nullptr) {
         // A pending link writes nothing; a TSid that would not read back as
         // a link is quoted.
         const char* text = formatLink(getLinkData(), "");
@@ -161,7 +159,7 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
             buffer.clear();
         } else {
             std::string written;
-            const char* tsid = m_link->spec->getTSid();
+            const char* tsid = link()->spec->getTSid();
             tsd_detail::appendLinkTSid(written, tsid);
             written += text + std::strlen(tsid);
             buffer.copy(written.c_str());
@@ -174,11 +172,11 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
 
 void Tsd_EndpointSpec::dump(DumpStream& stream, short indent) const {
     dumpLine(stream, indent, std::string("Tsd_EndpointSpec ") + orEmpty(getTSid()));
-    if (m_delay.has_value())
-        dumpLine(stream, indent, "   delay: " + tsd_detail::dumpTime(*m_delay));
+    if (delay() != nullptr)
+        dumpLine(stream, indent, "   delay: " + tsd_detail::dumpTime(*delay()));
     else
         dumpLine(stream, indent, "   delay unset");
-    if (!m_link) {
+    if (link() == nullptr) {
         dumpLine(stream, indent, "   link unset");
     } else {
         // A pending link, or one to a spec without TSid, has no text.
