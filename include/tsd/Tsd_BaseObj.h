@@ -8,7 +8,9 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <memory>
+#include <stdexcept>
 #include <vector>
 
 class DumpStream;
@@ -36,28 +38,69 @@ class Tsd_PathControl;
 class Tsd_PortTiming;
 
 // An owned copy of a zero-terminated string that may be null: the type of
-// every name, TSid, scope and similar text that an object keeps.
+// every name, TSid, scope and similar text that an object keeps. Texts of up
+// to 15 characters are held inside it, so get() points into the object and
+// lasts as long as it does (until it is set, assigned or moved from).
 class Tsd_String {
 public:
-    Tsd_String() = default;
-    explicit Tsd_String(const char* text) { set(text); }
-    Tsd_String(const Tsd_String& other) { set(other.get()); }
+    Tsd_String() { setNull(); }
+    explicit Tsd_String(const char* text) {
+        setNull();
+        set(text);
+    }
+    Tsd_String(const Tsd_String& other) {
+        setNull();
+        set(other.get());
+    }
     Tsd_String& operator=(const Tsd_String& other) {
         if (this != &other)
             set(other.get());
         return *this;
     }
-    Tsd_String(Tsd_String&&) noexcept = default;
-    Tsd_String& operator=(Tsd_String&&) noexcept = default;
+    Tsd_String(Tsd_String&& other) noexcept {
+        std::memcpy(m_bytes, other.m_bytes, sizeof m_bytes);
+        other.setNull();
+    }
+    Tsd_String& operator=(Tsd_String&& other) noexcept {
+        if (this != &other) {
+            release();
+            std::memcpy(m_bytes, other.m_bytes, sizeof m_bytes);
+            other.setNull();
+        }
+        return *this;
+    }
+    ~Tsd_String() { release(); }
 
     // Replaces the text by a copy of `text` (null stays null); `text` may
     // point into the current text.
     void set(const char* text);
-    const char* get() const { return m_text.get(); }
-    bool isNull() const { return m_text == nullptr; }
+    const char* get() const { return onHeap() ? heap() : reinterpret_cast<const char*>(m_bytes); }
+    bool isNull() const { return onHeap() && heap() == nullptr; }
 
 private:
-    std::unique_ptr<char[]> m_text;
+    // The last byte tells the two forms apart: a held text ends with a
+    // zero there (its terminator or its padding); kOnHeap marks a text held
+    // elsewhere, whose pointer (null for a null string) stands first.
+    static constexpr unsigned char kOnHeap = 0xFF;
+    static constexpr std::size_t kHeld = 15;
+
+    bool onHeap() const { return m_bytes[kHeld] == kOnHeap; }
+    char* heap() const {
+        char* p;
+        std::memcpy(&p, m_bytes, sizeof p);
+        return p;
+    }
+    void setHeap(char* p) {
+        std::memcpy(m_bytes, &p, sizeof p);
+        m_bytes[kHeld] = kOnHeap;
+    }
+    void setNull() { setHeap(nullptr); }
+    void release() {
+        if (onHeap())
+            delete[] heap();
+    }
+
+    alignas(char*) unsigned char m_bytes[kHeld + 1];
 };
 
 namespace tsd_detail {
@@ -104,43 +147,49 @@ private:
 template <class T>
 class Tsd_DArray {
 public:
-    // The storage is allocated on the first append, not here: most lists of
-    // a large design hold one or two pointers, or none.
+    // Nothing is allocated here, nor for the first slot: most lists of a
+    // large design hold one pointer, or none.
     explicit Tsd_DArray(int /*initialCapacity*/ = 10) {}
-    Tsd_DArray(const Tsd_DArray& other) : m_slots(other.m_slots), m_live(other.m_live) {}
+    Tsd_DArray(const Tsd_DArray& other) : m_live(other.m_live) { copySlots(other); }
     Tsd_DArray& operator=(const Tsd_DArray& other) {
         if (this != &other) {
-            m_slots = other.m_slots;
+            copySlots(other);
             m_live = other.m_live;
             m_index.reset();
             ++m_shape;
         }
         return *this;
     }
-    Tsd_DArray(Tsd_DArray&&) noexcept = default;
+    Tsd_DArray(Tsd_DArray&& other) noexcept
+        : m_heap(std::move(other.m_heap)), m_one(other.m_one), m_count(other.m_count),
+          m_capacity(other.m_capacity), m_live(other.m_live), m_shape(other.m_shape),
+          m_index(std::move(other.m_index)) {
+        other.forget();
+    }
     Tsd_DArray& operator=(Tsd_DArray&& other) noexcept {
-        m_slots = std::move(other.m_slots);
-        m_live = other.m_live;
-        m_index = std::move(other.m_index);
-        ++m_shape;
-        other.m_slots.clear();
-        other.m_live = 0;
-        ++other.m_shape;
+        if (this != &other) {
+            m_heap = std::move(other.m_heap);
+            m_one = other.m_one;
+            m_count = other.m_count;
+            m_capacity = other.m_capacity;
+            m_live = other.m_live;
+            m_index = std::move(other.m_index);
+            ++m_shape;
+            other.forget();
+        }
         return *this;
     }
     ~Tsd_DArray() = default;
 
-    int getCount() const { return static_cast<int>(m_slots.size()); }
+    int getCount() const { return m_count; }
     // Slot i, or null when i is outside 0..getCount()-1.
-    T* getAt(int i) const {
-        return i >= 0 && i < getCount() ? m_slots[static_cast<std::size_t>(i)] : nullptr;
-    }
+    T* getAt(int i) const { return i >= 0 && i < m_count ? slots()[i] : nullptr; }
     T* operator[](int i) const { return getAt(i); }
     // Stores p in slot i; ignored when i is outside 0..getCount()-1.
     void setAt(int i, T* p) {
         if (i < 0 || i >= getCount())
             return;
-        T*& slot = m_slots[static_cast<std::size_t>(i)];
+        T*& slot = slots()[i];
         T* old = slot;
         if (old == p)
             return;
@@ -150,7 +199,7 @@ public:
             if (m_index != nullptr && m_index->remove(old, i)) {
                 // Only a pointer stored twice by hand gets here.
                 int next = i + 1;
-                while (next < getCount() && m_slots[static_cast<std::size_t>(next)] != old)
+                while (next < getCount() && slots()[next] != old)
                     ++next;
                 m_index->setFirst(old, next);
             }
@@ -164,7 +213,9 @@ public:
         }
     }
     void append(T* p) {
-        m_slots.push_back(p);
+        if (m_count == m_capacity)
+            grow(static_cast<std::size_t>(m_capacity) * 2);
+        slots()[m_count++] = p;
         if (p != nullptr) {
             ++m_live;
             if (m_index != nullptr)
@@ -173,11 +224,15 @@ public:
     }
     // Sets the count (the storage is kept); new slots, if any, are null.
     void reset(int count) {
-        std::size_t n = count > 0 ? static_cast<std::size_t>(count) : 0u;
-        for (std::size_t i = n; i < m_slots.size(); ++i)
-            if (m_slots[i] != nullptr)
+        const int n = count > 0 ? count : 0;
+        for (int i = n; i < m_count; ++i)
+            if (slots()[i] != nullptr)
                 --m_live;
-        m_slots.resize(n);
+        if (n > m_capacity)
+            grow(static_cast<std::size_t>(n));
+        for (int i = m_count; i < n; ++i)
+            slots()[i] = nullptr;
+        m_count = n;
         m_index.reset();
         ++m_shape;
     }
@@ -185,9 +240,12 @@ public:
     void removeAt(int i) {
         if (i < 0 || i >= getCount())
             return;
-        if (m_slots[static_cast<std::size_t>(i)] != nullptr)
+        T** s = slots();
+        if (s[i] != nullptr)
             --m_live;
-        m_slots.erase(m_slots.begin() + i);
+        for (int k = i + 1; k < m_count; ++k)
+            s[k - 1] = s[k];
+        --m_count;
         m_index.reset();
         ++m_shape;
     }
@@ -202,7 +260,7 @@ protected:
         if (m_index == nullptr) {
             if (getCount() <= kScanLimit) {
                 for (int i = 0; i < getCount(); ++i)
-                    if (m_slots[static_cast<std::size_t>(i)] == p)
+                    if (slots()[i] == p)
                         return i;
                 return -1;
             }
@@ -218,18 +276,58 @@ private:
     // Arrays up to this size are scanned; an index would cost more.
     static constexpr int kScanLimit = 32;
 
+    T** slots() { return m_heap != nullptr ? m_heap.get() : &m_one; }
+    T* const* slots() const { return m_heap != nullptr ? m_heap.get() : &m_one; }
+
+    // Room for at least `capacity` slots, the first m_count kept.
+    void grow(std::size_t capacity) {
+        if (capacity < 4)
+            capacity = 4;
+        if (capacity > static_cast<std::size_t>(INT32_MAX))
+            throw std::length_error("Tsd_DArray: too many slots");
+        auto grown = std::make_unique<T*[]>(capacity);
+        T* const* old = slots();
+        for (int i = 0; i < m_count; ++i)
+            grown[static_cast<std::size_t>(i)] = old[i];
+        m_heap = std::move(grown);
+        m_capacity = static_cast<std::int32_t>(capacity);
+    }
+    void copySlots(const Tsd_DArray& other) {
+        m_heap.reset();
+        m_capacity = 1;
+        m_count = 0;
+        if (other.m_count > 1)
+            grow(static_cast<std::size_t>(other.m_count));
+        T* const* from = other.slots();
+        for (int i = 0; i < other.m_count; ++i)
+            slots()[i] = from[i];
+        m_count = other.m_count;
+    }
+    // Leaves a moved-from array empty.
+    void forget() {
+        m_heap.reset();
+        m_one = nullptr;
+        m_count = 0;
+        m_capacity = 1;
+        m_live = 0;
+        m_index.reset();
+        ++m_shape;
+    }
     void buildIndex() const {
         m_index = std::make_unique<Tsd_SlotIndex>();
         m_index->reserve(static_cast<std::size_t>(m_live));
         for (int i = 0; i < getCount(); ++i)
-            if (T* p = m_slots[static_cast<std::size_t>(i)])
+            if (T* p = slots()[i])
                 m_index->add(p, i);
     }
     // Changes whenever the array changes other than by appending or by
     // clearing a slot.
     std::uint32_t getShape() const { return m_shape; }
 
-    std::vector<T*> m_slots;
+    std::unique_ptr<T*[]> m_heap; // the slots, once there is more than one
+    T* m_one = nullptr;           // the slot of an array that never grew
+    std::int32_t m_count = 0;
+    std::int32_t m_capacity = 1;
     std::int32_t m_live = 0;
     std::uint32_t m_shape = 0;
     mutable std::unique_ptr<Tsd_SlotIndex> m_index;

@@ -16,6 +16,10 @@
 class Tsd_SpecGroupParser;
 class Tsd_NetParser;
 
+namespace tsd_detail {
+class StoredProps;
+} // namespace tsd_detail
+
 // A stored property: name and value, copied.
 struct Tsd_Prop {
     Tsd_String name;
@@ -110,7 +114,7 @@ private:
     // Runs `process` over stored properties under a context made from
     // `context`, then frees them.
     template <class Result>
-    void processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props, const char* context,
+    void processStoredProps(std::unique_ptr<tsd_detail::StoredProps>& props, const char* context,
                             Result (Tsd_Builder::*process)(const char*, const char*));
     bool initUserGroupFromProp(Tsd_UserGroup* group, const char* value);
     Tsd_Spec* buildSpecFromProp(const char* name, const char* value);
@@ -121,6 +125,8 @@ private:
     Tsd_Group* getSimpleGroup(const char* name, const char* value);
 
     Tsd_UserGroup* findUnresolvedGroupByName(const char* name) const;
+    // The slot of that placeholder in the list of unresolved groups, or -1.
+    int findUnresolvedSlot(const char* name) const;
     Tsd_EndpointSpec* getEndpointSpecForLink(const char* tsid);
     const char16_t* getObjUserId(Tsd_BaseObj* obj);
 
@@ -130,25 +136,27 @@ private:
     std::unique_ptr<Tsd_Design> m_ownedDesign;
     std::unique_ptr<Tsd_SpecGroupParser> m_specGroupParser;
     std::unique_ptr<Tsd_NetParser> m_netParser;
-    // The context, made from m_contextFormat and m_contextProp when it is
-    // first asked for: most properties never need theirs.
+    // The context, made from m_contextFormat and the property's name and
+    // value when it is first asked for: most properties never need theirs.
     mutable std::u16string m_context;
     mutable const char* m_contextFormat = nullptr;
-    const Tsd_Prop* m_contextProp = nullptr;
+    const char* m_contextName = nullptr;
+    const char* m_contextValue = nullptr;
     std::unique_ptr<char16_t[]> m_objUserId;
     short m_numError = 0;
     short m_numWarning = 0;
     Tsd_BaseObjList m_unresolvedGroups{10};
     // Finds placeholders by name; made on first use.
     mutable std::unique_ptr<tsd_detail::NameIndex> m_unresolvedIndex;
-    std::unique_ptr<DARRAY_Tsd_PropPtr> m_specProps;
-    std::unique_ptr<DARRAY_Tsd_PropPtr> m_groupProps;
-    DARRAY_Tsd_PendPtr m_pendingLinks;
+    std::unique_ptr<tsd_detail::StoredProps> m_specProps;
+    std::unique_ptr<tsd_detail::StoredProps> m_groupProps;
+    // Pending records by value; a consumed one keeps its place with no spec.
+    std::vector<Tsd_Pend> m_pendingLinks;
     // Where each spec's pending link record stands in m_pendingLinks; made
     // when a record other than the newest is first dropped.
     std::unique_ptr<Tsd_SlotIndex> m_pendingLinkSlot;
     Tsd_String m_pendingLinkTSid;
-    DARRAY_Tsd_PendPtr m_pendingRegGroups;
+    std::vector<Tsd_Pend> m_pendingRegGroups;
     Tsd_String m_pendingRegGroupName;
     bool m_built = false;
 };

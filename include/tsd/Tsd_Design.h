@@ -118,6 +118,8 @@ private:
     struct ListPair {
         Tsd_BaseObjList active{10};
         Tsd_BaseObjList trash{10};
+        // How many trash slots the is-trashed queries scanned so far.
+        mutable std::int64_t trashScanned = 0;
     };
 
     // The name indexes of the four finds, made on first use.
@@ -126,6 +128,10 @@ private:
 
     // Moves obj from the active list to the trash; false if not active.
     static bool moveToTrash(ListPair& pair, Tsd_BaseObj* obj);
+    // The same for an obj known to stand first at `slot` of the active list.
+    static void moveToTrashAt(ListPair& pair, Tsd_BaseObj* obj, int slot);
+    // Whether obj stands in the trash (false for null).
+    static bool inTrash(const ListPair& pair, const Tsd_BaseObj* obj);
     void dumpList(DumpStream& stream, short indent, const ListPair& pair) const;
 
     int trimRefObjs(ListPair& pair);

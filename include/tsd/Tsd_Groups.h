@@ -5,6 +5,7 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <vector>
 
 #include "tsd/Tsd_BaseObj.h"
@@ -161,6 +162,10 @@ private:
 class Tsd_GroupRef;
 class Tsd_UserGroupIter;
 
+namespace tsd_detail {
+class UserGroupMarks;
+} // namespace tsd_detail
+
 // A TIMEGRP definition: the union of its included members (each optionally
 // restricted to one edge) minus the union of its excluded members. It owns
 // its member entries, not the member groups.
@@ -197,13 +202,47 @@ public:
 private:
     friend class Tsd_UserGroupIter;
     friend class Tsd_Design;
+    friend class tsd_detail::UserGroupMarks;
+
+    // One member entry; a removed entry keeps its place with a null member.
+    struct Member {
+        Tsd_PredefGroup* group;
+        Edge edge;
+    };
+    // The entries of one member list, held by value: most user groups have
+    // one or two members, and the first is stored without an allocation.
+    class MemberList {
+    public:
+        MemberList() = default;
+        MemberList(const MemberList&) = delete;
+        MemberList& operator=(const MemberList&) = delete;
+
+        std::int32_t count() const { return m_count; }
+        Member& at(std::int32_t i) { return data()[i]; }
+        const Member& at(std::int32_t i) const { return data()[i]; }
+        void append(const Member& member);
+        void clear();
+
+    private:
+        Member* data() { return m_heap != nullptr ? m_heap.get() : &m_one; }
+        const Member* data() const { return m_heap != nullptr ? m_heap.get() : &m_one; }
+
+        std::unique_ptr<Member[]> m_heap; // once more than one entry was held
+        Member m_one{nullptr, EDGE_ANY};
+        std::int32_t m_count = 0;
+        std::int32_t m_capacity = 1;
+    };
 
     // Removes every entry whose member is one of `members`, which is sorted
     // by address; one pass however many members go.
     void removeMembers(const std::vector<const Tsd_PredefGroup*>& members, bool exclude);
 
-    Tsd_BaseObjList m_includes{10};
-    Tsd_BaseObjList m_excludes{10};
+    MemberList m_includes;
+    std::unique_ptr<MemberList> m_excludes; // made by the first exclusion
+    // A number that a pass over many groups keeps here, tagged with that
+    // pass; read only through its holder.
+    mutable std::uint64_t m_markTag = 0;
+    mutable std::uint32_t m_markValue = 0;
 };
 
 using DARRAY_Tsd_UserGroupPtr = Tsd_DArray<Tsd_UserGroup>;
@@ -233,5 +272,6 @@ public:
     Tsd_PredefGroup* next(Tsd_UserGroup::Edge& edge);
 
 private:
-    Tsd_BaseObjListIter m_iter;
+    const Tsd_UserGroup::MemberList* m_list;
+    std::int32_t m_index = 0;
 };

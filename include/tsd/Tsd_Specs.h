@@ -7,6 +7,7 @@
 #include "tsd/Tsd_Groups.h"
 
 #include <memory>
+#include <variant>
 
 // A number and its unit. Every time quantity of the specifications is one;
 // conversions go through picoseconds, and frequency units convert to times by
@@ -87,14 +88,14 @@ public:
     // The effective delay, following the link chain. Only for specs whose
     // checkLink() is 0; a broken chain is a fatal message.
     Tsd_TimeValue getDelayValue() const;
-    bool hasDelayValue() const { return m_delay != nullptr; }
+    bool hasDelayValue() const { return std::holds_alternative<Tsd_TimeValue>(m_delayOrLink); }
     void setDelayValue(const Tsd_TimeValue& delay);
     void setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor);
-    bool isLinked() const { return m_link != nullptr; }
+    bool isLinked() const { return std::holds_alternative<LinkData>(m_delayOrLink); }
     Tsd_EndpointSpec* getLinkedSpec() const;
     bool isLinkMultiplied() const;
     double getLinkFactor() const;
-    const LinkData* getLinkData() const { return m_link.get(); }
+    const LinkData* getLinkData() const { return std::get_if<LinkData>(&m_delayOrLink); }
 
     bool hasPriority() const { return m_priority != -1; }
     int getPriority() const { return m_priority; }
@@ -130,9 +131,18 @@ protected:
     const char* getDelayPropString() const;
 
 private:
-    std::unique_ptr<Tsd_TimeValue> m_delay;
-    std::unique_ptr<LinkData> m_link;
+    friend class tsd_detail::LinkGraph;
+
+    const Tsd_TimeValue* delay() const { return std::get_if<Tsd_TimeValue>(&m_delayOrLink); }
+    const LinkData* link() const { return getLinkData(); }
+
+    // Held in the spec, at most one of the two.
+    std::variant<std::monostate, Tsd_TimeValue, LinkData> m_delayOrLink;
     std::int32_t m_priority;
+    // This spec's node in the link graph being built, tagged with that
+    // graph; read only through it.
+    mutable std::int32_t m_graphNode = 0;
+    mutable std::uint64_t m_graphTag = 0;
     Tsd_TIGGroup* m_ignoreGroup;
     bool m_priorityWrittenAsNone = false;
 };
@@ -229,10 +239,10 @@ private:
     Tsd_TermGroup* m_periodGroup = nullptr;
     std::unique_ptr<Tsd_TimeValue> m_dutyCycleValue;
     double m_dutyCyclePercent = 0.0;
-    bool m_dutyCycleHigh = false;
     std::unique_ptr<Tsd_TimeValue> m_phase;
-    bool m_phasePositive = false;
     std::unique_ptr<Tsd_TimeValue> m_inputJitter;
+    bool m_dutyCycleHigh = false;
+    bool m_phasePositive = false;
 };
 
 // The global OFFSET: data arriving (IN) or leaving (OUT) so much time BEFORE

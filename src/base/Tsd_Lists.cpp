@@ -211,12 +211,20 @@ std::int32_t Tsd_SlotIndex::first(const void* p) const {
 }
 
 void Tsd_String::set(const char* text) {
+    // The old text goes last: `text` may point into it.
+    char* old = onHeap() ? heap() : nullptr;
     if (text == nullptr) {
-        m_text.reset();
-        return;
+        setNull();
+    } else {
+        const std::size_t n = std::strlen(text);
+        if (n <= kHeld) {
+            std::memmove(m_bytes, text, n);
+            std::memset(m_bytes + n, 0, sizeof m_bytes - n);
+        } else {
+            auto* copy = new char[n + 1];
+            std::memcpy(copy, text, n + 1);
+            setHeap(copy);
+        }
     }
-    size_t n = std::strlen(text);
-    auto copy = std::make_unique<char[]>(n + 1);
-    std::memcpy(copy.get(), text, n + 1);
-    m_text = std::move(copy);
+    delete[] old;
 }

@@ -5,12 +5,15 @@
 #include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_ObjText.h"
 #include "internal/Tsd_Report.h"
+#include "internal/Tsd_StoredProps.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cctype>
 #include <climits>
 #include <cstring>
+#include <initializer_list>
 #include <string>
+#include <string_view>
 
 using tsd_detail::equalsNoCase;
 using tsd_detail::orEmpty;
@@ -40,6 +43,19 @@ bool oneOf(const char* name, const char* const (&names)[N]) {
     return false;
 }
 
+// The texts one after the other, in one allocation: every property the
+// build parses is put together this way.
+std::string joined(std::initializer_list<std::string_view> parts) {
+    std::size_t size = 0;
+    for (std::string_view part : parts)
+        size += part.size();
+    std::string text;
+    text.reserve(size);
+    for (std::string_view part : parts)
+        text.append(part.data(), part.size());
+    return text;
+}
+
 // A defined name as the parser must see it: written as every name in
 // constraint text is, so that it reads back as one name.
 std::string nameForText(const char* name) {
@@ -67,7 +83,8 @@ std::string caretLine(int column, int prefix, const std::string& written, const 
 bool hasOffsetKeyword(const char* value) {
     const size_t length = std::strlen(value);
     for (size_t i = 0; i + 6 <= length; ++i) {
-        if (!startsWithNoCase(value + i, "OFFSET"))
+        // Only an 'o' can begin the keyword: a cheap test before the full one.
+        if ((value[i] | 0x20) != 'o' || !startsWithNoCase(value + i, "OFFSET", 6))
             continue;
         if (i + 6 >= length)
             return false;
@@ -121,8 +138,8 @@ void Tsd_Builder::setContext(const char16_t* context) {
 
 const char16_t* Tsd_Builder::getContext() const {
     if (m_contextFormat != nullptr) {
-        std::unique_ptr<char16_t[]> context = translateMessage(
-            "TSDatabase", m_contextFormat, m_contextProp->name.get(), m_contextProp->value.get());
+        std::unique_ptr<char16_t[]> context =
+            translateMessage("TSDatabase", m_contextFormat, m_contextName, m_contextValue);
         m_contextFormat = nullptr;
         if (context == nullptr)
             m_context.clear();
@@ -147,12 +164,9 @@ void Tsd_Builder::addErrorCount(int n) {
 bool Tsd_Builder::addUserGroupProp(const char* name, const char* value) {
     if (name == nullptr)
         return false;
-    if (m_groupProps == nullptr) {
-        m_groupProps = std::make_unique<DARRAY_Tsd_PropPtr>();
-        m_groupProps->reserve(50);
-    }
-    m_groupProps->push_back(
-        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
+    if (m_groupProps == nullptr)
+        m_groupProps = std::make_unique<tsd_detail::StoredProps>();
+    m_groupProps->add(name, orEmpty(value));
     return true;
 }
 
@@ -164,12 +178,9 @@ bool Tsd_Builder::addSpecProp(const char* name, const char* value) {
                  startsWithNoCase(name, "TIMEGRP");
     if (!known)
         return false;
-    if (m_specProps == nullptr) {
-        m_specProps = std::make_unique<DARRAY_Tsd_PropPtr>();
-        m_specProps->reserve(50);
-    }
-    m_specProps->push_back(
-        std::make_unique<Tsd_Prop>(Tsd_Prop{Tsd_String(name), Tsd_String(orEmpty(value))}));
+    if (m_specProps == nullptr)
+        m_specProps = std::make_unique<tsd_detail::StoredProps>();
+    m_specProps->add(name, orEmpty(value));
     return true;
 }
 
@@ -279,7 +290,10 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
     Tsd_Design& d = design();
     value = orEmpty(value);
     bool inDesign = false;
-    Tsd_UserGroup* group = findUnresolvedGroupByName(name);
+    const int placeholderSlot = findUnresolvedSlot(name);
+    const std::uint32_t unresolvedShape = tsd_detail::NameIndex::shapeOf(m_unresolvedGroups);
+    Tsd_UserGroup* group =
+        placeholderSlot >= 0 ? m_unresolvedGroups.getAt(placeholderSlot)->getUserGroup() : nullptr;
     if (group == nullptr) {
         Tsd_Group* found = d.findGroupByUserName(name, false);
         if (found != nullptr) {
@@ -302,8 +316,16 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
     bool defined = initUserGroupFromProp(group, value);
     if (!inDesign) {
         // A placeholder becomes the defined group itself, so groups that
-        // already include it keep pointing at the right object.
-        m_unresolvedGroups.removeObj(group);
+        // already include it keep pointing at the right object. Where the
+        // list kept its layout the placeholder still stands where it was
+        // found, as the first slot holding it; a new group stands nowhere.
+        if (placeholderSlot >= 0) {
+            if (tsd_detail::NameIndex::shapeOf(m_unresolvedGroups) == unresolvedShape &&
+                m_unresolvedGroups.getAt(placeholderSlot) == group)
+                m_unresolvedGroups.setAt(placeholderSlot, nullptr);
+            else
+                m_unresolvedGroups.removeObj(group);
+        }
         d.addGroup(group);
     }
     return defined ? group : nullptr;
@@ -312,7 +334,7 @@ Tsd_UserGroup* Tsd_Builder::processGroupProp(const char* name, const char* value
 bool Tsd_Builder::initUserGroupFromProp(Tsd_UserGroup* group, const char* value) {
     const char* name = orEmpty(group->getName());
     const std::string written = nameForText(name);
-    std::string text = "TIMEGRP " + written + "=" + value + " ;";
+    const std::string text = joined({"TIMEGRP ", written, "=", value, " ;"});
     m_specGroupParser->setNewGroup(group);
     m_specGroupParser->clearError();
     if (m_specGroupParser->parse(text.c_str())) {
@@ -367,24 +389,23 @@ void Tsd_Builder::dropPendingLink(const Tsd_Spec* spec, bool newest) {
     // cleared entries, and the positions of the others stay valid.
     if (newest) {
         // Its record, if any, is the last one made.
-        if (!m_pendingLinks.empty() && m_pendingLinks.back() != nullptr &&
-            m_pendingLinks.back()->spec == spec) {
+        if (!m_pendingLinks.empty() && m_pendingLinks.back().spec == spec) {
             if (m_pendingLinkSlot != nullptr)
                 m_pendingLinkSlot->remove(spec, static_cast<int>(m_pendingLinks.size() - 1));
-            m_pendingLinks.back().reset();
+            m_pendingLinks.back() = Tsd_Pend();
         }
         return;
     }
     if (m_pendingLinkSlot == nullptr) {
         m_pendingLinkSlot = std::make_unique<Tsd_SlotIndex>();
         for (std::size_t i = 0; i < m_pendingLinks.size(); ++i)
-            if (m_pendingLinks[i] != nullptr)
-                m_pendingLinkSlot->add(m_pendingLinks[i]->spec, static_cast<int>(i));
+            if (m_pendingLinks[i].spec != nullptr)
+                m_pendingLinkSlot->add(m_pendingLinks[i].spec, static_cast<int>(i));
     }
     const int slot = m_pendingLinkSlot->first(spec);
     if (slot < 0)
         return;
-    m_pendingLinks[static_cast<std::size_t>(slot)].reset();
+    m_pendingLinks[static_cast<std::size_t>(slot)] = Tsd_Pend();
     m_pendingLinkSlot->remove(spec, slot);
 }
 
@@ -398,15 +419,15 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
     std::string written = name;
     if (equalsNoCase(name, "OFFSET") || equalsNoCase(name, "ENABLE") ||
         equalsNoCase(name, "DISABLE")) {
-        text = std::string(name) + "=" + value + " ;";
+        text = joined({name, "=", value, " ;"});
         prefix = 1;
     } else if (startsWithNoCase(name, "TS") && hasOffsetKeyword(value)) {
-        text = std::string(value) + " ;";
+        text = joined({value, " ;"});
         prefix = 1;
         shift = static_cast<int>(std::strlen(name)) + 1;
     } else {
         written = nameForText(name);
-        text = "TIMESPEC " + written + "=" + value + " ;";
+        text = joined({"TIMESPEC ", written, "=", value, " ;"});
         prefix = 10;
     }
     m_specGroupParser->clearError();
@@ -439,7 +460,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
             TSD_MSG().fatal(2, "Non-endpoint spec %s has pending TSid!\n", name);
         if (m_pendingLinkSlot != nullptr)
             m_pendingLinkSlot->add(endpoint, static_cast<int>(m_pendingLinks.size()));
-        m_pendingLinks.push_back(std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingLinkTSid, endpoint}));
+        m_pendingLinks.push_back(Tsd_Pend{m_pendingLinkTSid, endpoint});
         m_pendingLinkTSid.set(nullptr);
     }
     return spec.release();
@@ -448,7 +469,7 @@ Tsd_Spec* Tsd_Builder::buildSpecFromProp(const char* name, const char* value) {
 Tsd_Spec* Tsd_Builder::buildNetSpecFromProp(const char* name, const char* value) {
     if (!oneOf(name, kNetRefProps))
         TSD_MSG().fatal(2, "Non net-spec prop %s=%s\n", name, value);
-    std::string text = std::string(name + 3) + "=" + value + " ;";
+    const std::string text = joined({name + 3, "=", value, " ;"});
     m_netParser->clearError();
     m_netParser->setNewSpec(nullptr);
     m_pendingRegGroupName.set(nullptr);
@@ -470,8 +491,7 @@ Tsd_Spec* Tsd_Builder::buildNetSpecFromProp(const char* name, const char* value)
         Tsd_NetOffset* offset = spec->getNetOffset();
         if (offset == nullptr)
             TSD_MSG().fatal(2, "Non-net offset spec has pending reg group!\n");
-        m_pendingRegGroups.push_back(
-            std::make_unique<Tsd_Pend>(Tsd_Pend{m_pendingRegGroupName, offset}));
+        m_pendingRegGroups.push_back(Tsd_Pend{m_pendingRegGroupName, offset});
         m_pendingRegGroupName.set(nullptr);
     }
     return spec.release();

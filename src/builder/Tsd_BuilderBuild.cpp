@@ -6,6 +6,7 @@
 #include "internal/Tsd_LinkGraph.h"
 #include "internal/Tsd_NameIndex.h"
 #include "internal/Tsd_Report.h"
+#include "internal/Tsd_StoredProps.h"
 #include "tsd/Tsd_Parsers.h"
 
 #include <cstring>
@@ -189,19 +190,22 @@ Tsd_Design* Tsd_Builder::buildTSDesign() {
 }
 
 template <class Result>
-void Tsd_Builder::processStoredProps(std::unique_ptr<DARRAY_Tsd_PropPtr>& props,
+void Tsd_Builder::processStoredProps(std::unique_ptr<tsd_detail::StoredProps>& props,
                                      const char* context,
                                      Result (Tsd_Builder::*process)(const char*, const char*)) {
     if (props == nullptr)
         return;
     // Each message names the definition it comes from through the context.
-    for (std::unique_ptr<Tsd_Prop>& prop : *props) {
+    // The count is read anew: a hook may store more properties.
+    for (std::size_t i = 0; i < props->size(); ++i) {
+        const tsd_detail::StoredProps::Prop prop = props->at(i);
         // The context is made when a message first asks for it.
         m_contextFormat = context;
-        m_contextProp = prop.get();
-        (this->*process)(prop->name.get(), prop->value.get());
+        m_contextName = prop.name;
+        m_contextValue = prop.value;
+        (this->*process)(prop.name, prop.value);
         m_contextFormat = nullptr;
-        prop.reset();
+        props->releaseBefore(i + 1);
     }
     props.reset();
     setContext(nullptr);
@@ -221,16 +225,16 @@ void Tsd_Builder::resolvePendingOffsets() {
     Tsd_Design& d = design();
     const bool referenceMode =
         d.getRefType() != nullptr && std::strcmp(d.getRefType(), "MM_TSREF") == 0;
-    for (std::unique_ptr<Tsd_Pend>& pend : m_pendingRegGroups) {
-        if (pend == nullptr)
+    for (Tsd_Pend& pend : m_pendingRegGroups) {
+        if (pend.spec == nullptr)
             continue;
-        const char* name = pend->name.get();
-        Tsd_Offset* offset = pend->spec->getOffset();
+        const char* name = pend.name.get();
+        Tsd_Offset* offset = pend.spec->getOffset();
         Tsd_Group* found = d.findGroupByUserName(name, false);
         if (found != nullptr) {
             if (Tsd_TermGroup* term = found->getTermGroup()) {
                 offset->setRegGroup(term);
-                pend.reset();
+                pend = Tsd_Pend();
             } else {
                 TSD_MSG().error("Group \"%s\" is used as the register group in one or more OFFSET "
                                 "specifications. This group is %z, which is not the correct type: "
@@ -280,18 +284,18 @@ void Tsd_Builder::resolvePendingOffsets() {
 void Tsd_Builder::resolvePendingLinks() {
     Tsd_Design& d = design();
     bool failed = false;
-    for (std::unique_ptr<Tsd_Pend>& pend : m_pendingLinks) {
-        if (pend == nullptr)
+    for (Tsd_Pend& pend : m_pendingLinks) {
+        if (pend.spec == nullptr)
             continue;
-        Tsd_EndpointSpec* waiting = pend->spec->getEndpointSpec();
-        Tsd_EndpointSpec* found = d.findEndpointSpecByTSid(pend->name.get(), true);
+        Tsd_EndpointSpec* waiting = pend.spec->getEndpointSpec();
+        Tsd_EndpointSpec* found = d.findEndpointSpecByTSid(pend.name.get(), true);
         if (found != nullptr) {
             waiting->setLinkData(found, waiting->isLinkMultiplied(), waiting->getLinkFactor());
-            pend.reset();
+            pend = Tsd_Pend();
         } else {
             TSD_MSG().error("Specification \"%s\" is defined in terms of a specification with "
                             "TSid \"%s\", which does not exist.\n",
-                            waiting->getTSid(), pend->name.get());
+                            waiting->getTSid(), pend.name.get());
             countError();
             failed = true;
         }
@@ -351,13 +355,13 @@ void Tsd_Builder::dump(DumpStream& stream, short indent) const {
     while (Tsd_BaseObj* obj = unresolved.next())
         obj->dump(stream, static_cast<short>(indent + 2));
     stream << pad << "   pending links remaining:" << DumpStream::endl;
-    for (const std::unique_ptr<Tsd_Pend>& pend : m_pendingLinks)
-        if (pend != nullptr)
-            stream << pad << "      " << pend->name.get() << DumpStream::endl;
+    for (const Tsd_Pend& pend : m_pendingLinks)
+        if (pend.spec != nullptr)
+            stream << pad << "      " << pend.name.get() << DumpStream::endl;
     stream << pad << "   pending reg groups remaining:" << DumpStream::endl;
-    for (const std::unique_ptr<Tsd_Pend>& pend : m_pendingRegGroups)
-        if (pend != nullptr)
-            stream << pad << "      " << pend->name.get() << DumpStream::endl;
+    for (const Tsd_Pend& pend : m_pendingRegGroups)
+        if (pend.spec != nullptr)
+            stream << pad << "      " << pend.name.get() << DumpStream::endl;
     if (m_ownedDesign != nullptr)
         m_ownedDesign->dump(stream, static_cast<short>(indent + 1));
     stream << pad << "   builder error count: " << static_cast<std::int32_t>(m_numError)

@@ -8,8 +8,14 @@
 #include <string>
 
 Tsd_UserGroup* Tsd_Builder::findUnresolvedGroupByName(const char* name) const {
-    if (name == nullptr)
-        return nullptr;
+    const int slot = findUnresolvedSlot(name);
+    return slot >= 0 ? m_unresolvedGroups.getAt(slot)->getUserGroup() : nullptr;
+}
+
+int Tsd_Builder::findUnresolvedSlot(const char* name) const {
+    // Most groups are defined before they are named, or soon after.
+    if (name == nullptr || m_unresolvedGroups.isEmpty())
+        return -1;
     if (m_unresolvedIndex == nullptr) {
         // Whatever else a user builder puts in the list is passed over.
         m_unresolvedIndex = std::make_unique<tsd_detail::NameIndex>(
@@ -18,8 +24,7 @@ Tsd_UserGroup* Tsd_Builder::findUnresolvedGroupByName(const char* name) const {
                 return group != nullptr ? group->getName() : nullptr;
             });
     }
-    int slot = m_unresolvedIndex->find(m_unresolvedGroups, name).slot;
-    return slot >= 0 ? m_unresolvedGroups.getAt(slot)->getUserGroup() : nullptr;
+    return m_unresolvedIndex->find(m_unresolvedGroups, name).slot;
 }
 
 const char16_t* Tsd_Builder::getObjUserId(Tsd_BaseObj* obj) {

@@ -77,6 +77,26 @@ bool Tsd_Design::moveToTrash(ListPair& pair, Tsd_BaseObj* obj) {
     return true;
 }
 
+void Tsd_Design::moveToTrashAt(ListPair& pair, Tsd_BaseObj* obj, int slot) {
+    pair.active.setAt(slot, nullptr);
+    pair.trash.addObj(obj);
+}
+
+bool Tsd_Design::inTrash(const ListPair& pair, const Tsd_BaseObj* obj) {
+    // A large trash asked about a few times is scanned: an index of it
+    // costs more than that. Once the scans have cost twice its size, its
+    // index answers.
+    const Tsd_BaseObjList& trash = pair.trash;
+    const int count = trash.getCount();
+    if (obj == nullptr || count <= 32 || pair.trashScanned >= 2 * static_cast<std::int64_t>(count))
+        return trash.contains(obj);
+    int slot = 0;
+    while (slot < count && trash.getAt(slot) != obj)
+        ++slot;
+    pair.trashScanned += slot + 1;
+    return slot < count;
+}
+
 void Tsd_Design::addGroup(Tsd_Group* group) {
     m_groups.active.addObj(group);
 }
@@ -84,7 +104,7 @@ bool Tsd_Design::moveGroupToTrash(Tsd_Group* group) {
     return moveToTrash(m_groups, group);
 }
 bool Tsd_Design::isGroupTrashed(const Tsd_Group* group) const {
-    return m_groups.trash.contains(group);
+    return inTrash(m_groups, group);
 }
 
 void Tsd_Design::addClockGroup(Tsd_ClkGroup* group) {
@@ -94,7 +114,7 @@ bool Tsd_Design::moveClockGroupToTrash(Tsd_ClkGroup* group) {
     return moveToTrash(m_clockGroups, group);
 }
 bool Tsd_Design::isClockGroupTrashed(const Tsd_ClkGroup* group) const {
-    return m_clockGroups.trash.contains(group);
+    return inTrash(m_clockGroups, group);
 }
 
 void Tsd_Design::addTIGGroup(Tsd_TIGGroup* group) {
@@ -104,7 +124,7 @@ bool Tsd_Design::moveTIGGroupToTrash(Tsd_TIGGroup* group) {
     return moveToTrash(m_tigGroups, group);
 }
 bool Tsd_Design::isTIGGroupTrashed(const Tsd_TIGGroup* group) const {
-    return m_tigGroups.trash.contains(group);
+    return inTrash(m_tigGroups, group);
 }
 
 void Tsd_Design::addEndpointSpec(Tsd_EndpointSpec* spec) {
@@ -114,7 +134,7 @@ bool Tsd_Design::moveEndpointSpecToTrash(Tsd_EndpointSpec* spec) {
     return moveToTrash(m_endpointSpecs, spec);
 }
 bool Tsd_Design::isEndpointSpecTrashed(const Tsd_EndpointSpec* spec) const {
-    return m_endpointSpecs.trash.contains(spec);
+    return inTrash(m_endpointSpecs, spec);
 }
 
 void Tsd_Design::addOffsetSpec(Tsd_Offset* spec) {
@@ -124,7 +144,7 @@ bool Tsd_Design::moveOffsetSpecToTrash(Tsd_Offset* spec) {
     return moveToTrash(m_offsetSpecs, spec);
 }
 bool Tsd_Design::isOffsetSpecTrashed(const Tsd_Offset* spec) const {
-    return m_offsetSpecs.trash.contains(spec);
+    return inTrash(m_offsetSpecs, spec);
 }
 
 void Tsd_Design::addNetSpec(Tsd_NetTiming* spec) {
@@ -134,7 +154,7 @@ bool Tsd_Design::moveNetSpecToTrash(Tsd_NetTiming* spec) {
     return moveToTrash(m_netSpecs, spec);
 }
 bool Tsd_Design::isNetSpecTrashed(const Tsd_NetTiming* spec) const {
-    return m_netSpecs.trash.contains(spec);
+    return inTrash(m_netSpecs, spec);
 }
 
 void Tsd_Design::addPathControl(Tsd_PathControl* spec) {
@@ -144,7 +164,7 @@ bool Tsd_Design::movePathControlToTrash(Tsd_PathControl* spec) {
     return moveToTrash(m_pathControls, spec);
 }
 bool Tsd_Design::isPathControlTrashed(const Tsd_PathControl* spec) const {
-    return m_pathControls.trash.contains(spec);
+    return inTrash(m_pathControls, spec);
 }
 
 void Tsd_Design::addPortTiming(Tsd_PortTiming* spec) {
@@ -154,7 +174,7 @@ bool Tsd_Design::movePortTimingToTrash(Tsd_PortTiming* spec) {
     return moveToTrash(m_portSpecs, spec);
 }
 bool Tsd_Design::isPortTimingTrashed(const Tsd_PortTiming* spec) const {
-    return m_portSpecs.trash.contains(spec);
+    return inTrash(m_portSpecs, spec);
 }
 
 namespace {

@@ -2,6 +2,7 @@
 // survivors from the trash, and listing the holders of a group.
 #include "tsd/Tsd_Design.h"
 
+#include "internal/Tsd_GroupCircles.h"
 #include "internal/Tsd_LinkGraph.h"
 #include "internal/Tsd_Report.h"
 
@@ -347,11 +348,15 @@ private:
 } // namespace
 
 int Tsd_Design::trimRefObjs(ListPair& pair) {
+    // Walking in list order, an object that goes has gone from every earlier
+    // slot too (the test gave the same answer there), so the slot it is met
+    // at is its first: it leaves from there without a search of the list.
     int count = 0;
-    Tsd_BaseObjListIter iter(&pair.active);
-    while (Tsd_BaseObj* obj = iter.next()) {
-        Tsd_RefList* refs = obj->getRefList();
-        if (refs != nullptr && refs->isEmpty() && moveToTrash(pair, obj)) {
+    for (int slot = 0; slot < pair.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = pair.active.getAt(slot);
+        Tsd_RefList* refs = obj != nullptr ? obj->getRefList() : nullptr;
+        if (refs != nullptr && refs->isEmpty()) {
+            moveToTrashAt(pair, obj, slot);
             reportObjTrashed(obj, TRIM_NO_REFERENCES);
             ++count;
         }
@@ -393,18 +398,27 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         if (Tsd_UserGroup* group = obj != nullptr ? obj->getUserGroup() : nullptr)
             nodes.push_back({group, slot, 0});
     }
+    // Each listed user group's node, found from the group: through the
+    // groups' marks, or else by address in a sorted table.
+    tsd_detail::UserGroupMarks marks;
     std::vector<std::pair<const Tsd_BaseObj*, int>> byAddress;
-    byAddress.reserve(nodes.size());
-    for (std::size_t k = 0; k < nodes.size(); ++k)
-        byAddress.emplace_back(nodes[k].group, static_cast<int>(k));
-    std::sort(byAddress.begin(), byAddress.end(),
-              [](const auto& a, const auto& b) { return std::less<>()(a.first, b.first); });
-
     // A group listed twice is met by the passes at two places: such a design
     // is trimmed pass by pass.
     bool plain = true;
-    for (std::size_t k = 1; k < byAddress.size() && plain; ++k)
-        plain = byAddress[k].first != byAddress[k - 1].first;
+    if (marks.held()) {
+        for (std::size_t k = 0; k < nodes.size() && plain; ++k) {
+            plain = marks.get(nodes[k].group) < 0;
+            marks.set(nodes[k].group, static_cast<std::uint32_t>(k));
+        }
+    } else {
+        byAddress.reserve(nodes.size());
+        for (std::size_t k = 0; k < nodes.size(); ++k)
+            byAddress.emplace_back(nodes[k].group, static_cast<int>(k));
+        std::sort(byAddress.begin(), byAddress.end(),
+                  [](const auto& a, const auto& b) { return std::less<>()(a.first, b.first); });
+        for (std::size_t k = 1; k < byAddress.size() && plain; ++k)
+            plain = byAddress[k].first != byAddress[k - 1].first;
+    }
     if (!plain) {
         int count = 0;
         for (int n = trimUserGroups(); n != 0; n = trimUserGroups())
@@ -412,7 +426,12 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         return count;
     }
 
-    auto nodeOf = [&](const Tsd_BaseObj* obj) {
+    auto nodeOf = [&](Tsd_PredefGroup* member) -> int {
+        if (marks.held()) {
+            const Tsd_UserGroup* user = member->getUserGroup();
+            return user != nullptr ? static_cast<int>(marks.get(user)) : -1;
+        }
+        const Tsd_BaseObj* obj = member;
         auto it = std::lower_bound(
             byAddress.begin(), byAddress.end(), obj,
             [](const auto& entry, const Tsd_BaseObj* p) { return std::less<>()(entry.first, p); });
@@ -465,7 +484,10 @@ int Tsd_Design::trimUserGroupsToTheEnd() {
         const Node& node = nodes[static_cast<std::size_t>(events.top().second)];
         const int k = events.top().second;
         events.pop();
-        if (!moveToTrash(m_groups, node.group))
+        // Listed once, a group still at its slot stands first there.
+        if (active.getAt(node.slot) == node.group)
+            moveToTrashAt(m_groups, node.group, node.slot);
+        else if (!moveToTrash(m_groups, node.group))
             continue;
         reportObjTrashed(node.group, TRIM_EMPTY_USER_GROUP);
         ++count;
@@ -492,9 +514,13 @@ bool Tsd_Design::trim() {
     // empty another that was walked before it.
     count += trimUserGroupsToTheEnd();
 
-    // 3. Endpoint specs whose groups are gone.
-    Tsd_BaseObjListIter specs(&m_endpointSpecs.active);
-    while (Tsd_BaseObj* obj = specs.next()) {
+    // 3. Endpoint specs whose groups are gone. Here and in steps 5 and 6 a
+    // spec that goes stands first at the slot it is met at, as in
+    // trimRefObjs.
+    for (int slot = 0; slot < m_endpointSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_endpointSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         TrimReason reason = TRIM_NONE;
         if (Tsd_DelayPath* path = obj->getDelayPath()) {
             if (path->getStart() != nullptr && isGroupTrashed(path->getStart()))
@@ -514,7 +540,8 @@ bool Tsd_Design::trim() {
             if (period->getPeriodGroup() != nullptr && isGroupTrashed(period->getPeriodGroup()))
                 reason = TRIM_PERIOD_GROUP;
         }
-        if (reason != TRIM_NONE && moveToTrash(m_endpointSpecs, obj)) {
+        if (reason != TRIM_NONE) {
+            moveToTrashAt(m_endpointSpecs, obj, slot);
             reportObjTrashed(obj, reason);
             ++count;
         }
@@ -534,8 +561,10 @@ bool Tsd_Design::trim() {
     }
 
     // 5. Offsets whose clock, reference pin, register or pad group is gone.
-    Tsd_BaseObjListIter offsets(&m_offsetSpecs.active);
-    while (Tsd_BaseObj* obj = offsets.next()) {
+    for (int slot = 0; slot < m_offsetSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_offsetSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_Offset* offset = obj->getOffset();
         if (offset == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
@@ -551,20 +580,24 @@ bool Tsd_Design::trim() {
         else if (groupOffset != nullptr && groupOffset->getPadGroup() != nullptr &&
                  isGroupTrashed(groupOffset->getPadGroup()))
             reason = TRIM_PAD_GROUP;
-        if (reason != TRIM_NONE && moveToTrash(m_offsetSpecs, obj)) {
+        if (reason != TRIM_NONE) {
+            moveToTrashAt(m_offsetSpecs, obj, slot);
             reportObjTrashed(obj, reason);
             ++count;
         }
     }
 
     // 6. Port timings whose secondary group is gone.
-    Tsd_BaseObjListIter ports(&m_portSpecs.active);
-    while (Tsd_BaseObj* obj = ports.next()) {
+    for (int slot = 0; slot < m_portSpecs.active.getCount(); ++slot) {
+        Tsd_BaseObj* obj = m_portSpecs.active.getAt(slot);
+        if (obj == nullptr)
+            continue;
         Tsd_PortTiming* port = obj->getPortTiming();
         if (port == nullptr)
             TSD_MSG().fatal(2, "Wrong object type.\n");
         if (port->getSecondaryGroup() != nullptr &&
-            isClockGroupTrashed(port->getSecondaryGroup()) && moveToTrash(m_portSpecs, obj)) {
+            isClockGroupTrashed(port->getSecondaryGroup())) {
+            moveToTrashAt(m_portSpecs, obj, slot);
             reportObjTrashed(obj, TRIM_CLOCK_GROUP);
             ++count;
         }

@@ -50,18 +50,6 @@ const char* edgeDumpText(Tsd_UserGroup::Edge edge) {
     }
 }
 
-// The entries of a member list are all Tsd_GroupRef: only this module
-// fills the lists.
-Tsd_GroupRef* entryAt(const Tsd_BaseObjList& list, int i) {
-    return static_cast<Tsd_GroupRef*>(list.getAt(i));
-}
-
-void deleteEntries(Tsd_BaseObjList& list) {
-    for (int i = 0; i < list.getCount(); ++i)
-        delete entryAt(list, i);
-    list.emptyList();
-}
-
 void copyEntries(const Tsd_UserGroup& from, bool excludes, Tsd_UserGroup& to) {
     Tsd_UserGroupIter iter(&from, excludes);
     Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
@@ -78,29 +66,42 @@ Tsd_UserGroup::Tsd_UserGroup(const Tsd_UserGroup& other) : Tsd_PredefGroup(other
     copyEntries(other, true, *this);
 }
 
-Tsd_UserGroup::~Tsd_UserGroup() {
-    deleteEntries(m_includes);
-    deleteEntries(m_excludes);
+Tsd_UserGroup::~Tsd_UserGroup() = default;
+
+void Tsd_UserGroup::MemberList::append(const Member& member) {
+    if (m_count == m_capacity) {
+        const std::int32_t capacity = m_capacity < 4 ? 4 : 2 * m_capacity;
+        auto grown = std::make_unique<Member[]>(static_cast<std::size_t>(capacity));
+        std::copy(data(), data() + m_count, grown.get());
+        m_heap = std::move(grown);
+        m_capacity = capacity;
+    }
+    data()[m_count++] = member;
+}
+
+void Tsd_UserGroup::MemberList::clear() {
+    m_heap.reset();
+    m_capacity = 1;
+    m_count = 0;
 }
 
 void Tsd_UserGroup::addGroup(Tsd_PredefGroup* group, Edge edge, bool exclude) {
-    // An entry without a member would end every walk of the list early and
-    // hide the members added after it.
+    // A null member marks a removed entry.
     if (group == nullptr)
         return;
-    (exclude ? m_excludes : m_includes).addObj(new Tsd_GroupRef(group, edge));
+    if (exclude && m_excludes == nullptr)
+        m_excludes = std::make_unique<MemberList>();
+    (exclude ? *m_excludes : m_includes).append(Member{group, edge});
 }
 
 bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
-    if (group == nullptr)
+    MemberList* list = exclude ? m_excludes.get() : &m_includes;
+    if (group == nullptr || list == nullptr)
         return false;
-    Tsd_BaseObjList& list = exclude ? m_excludes : m_includes;
     bool removed = false;
-    for (int i = 0; i < list.getCount(); ++i) {
-        Tsd_GroupRef* entry = entryAt(list, i);
-        if (entry != nullptr && entry->getMember() == group) {
-            list.setAt(i, nullptr);
-            delete entry;
+    for (std::int32_t i = 0; i < list->count(); ++i) {
+        if (list->at(i).group == group) {
+            list->at(i).group = nullptr;
             removed = true;
         }
     }
@@ -109,21 +110,19 @@ bool Tsd_UserGroup::removeGroup(Tsd_PredefGroup* group, bool exclude) {
 
 void Tsd_UserGroup::removeMembers(const std::vector<const Tsd_PredefGroup*>& members,
                                   bool exclude) {
-    Tsd_BaseObjList& list = exclude ? m_excludes : m_includes;
-    for (int i = 0; i < list.getCount(); ++i) {
-        Tsd_GroupRef* entry = entryAt(list, i);
-        if (entry != nullptr &&
-            std::binary_search(members.begin(), members.end(), entry->getMember(),
-                               std::less<const Tsd_PredefGroup*>())) {
-            list.setAt(i, nullptr);
-            delete entry;
-        }
+    MemberList* list = exclude ? m_excludes.get() : &m_includes;
+    for (std::int32_t i = 0; list != nullptr && i < list->count(); ++i) {
+        Member& entry = list->at(i);
+        if (entry.group != nullptr &&
+            std::binary_search(members.begin(), members.end(), entry.group,
+                               std::less<const Tsd_PredefGroup*>()))
+            entry.group = nullptr;
     }
 }
 
 void Tsd_UserGroup::clearDef() {
-    deleteEntries(m_includes);
-    deleteEntries(m_excludes);
+    m_includes.clear();
+    m_excludes.reset();
 }
 
 bool Tsd_UserGroup::getProp(const char*& name, const char*& value) const {
@@ -169,27 +168,12 @@ void Tsd_UserGroup::dump(DumpStream& stream, short indent) const {
 namespace {
 
 // One user group on the current route of the circular-definition walk, and
-// how far its members have been walked: included members first, then
-// excluded ones.
+// how far its members have been walked, included members first, then
+// excluded ones: sixteen bytes, for routes a million groups deep.
 struct Frame {
     Tsd_UserGroup* group;
-    Tsd_UserGroupIter members;
-    bool inExcludes;
-    int countOnEntry;
-
-    Frame(Tsd_UserGroup* g, int count)
-        : group(g), members(g, false), inExcludes(false), countOnEntry(count) {}
-
-    Tsd_PredefGroup* nextMember() {
-        Tsd_UserGroup::Edge edge = Tsd_UserGroup::EDGE_ANY;
-        Tsd_PredefGroup* member = members.next(edge);
-        if (member == nullptr && !inExcludes) {
-            inExcludes = true;
-            members = Tsd_UserGroupIter(group, true);
-            member = members.next(edge);
-        }
-        return member;
-    }
+    std::int32_t position;
+    std::int32_t countOnEntry;
 };
 
 void reportCircle(const std::vector<Frame>& route) {
@@ -206,6 +190,65 @@ void reportCircle(const std::vector<Frame>& route) {
 
 } // namespace
 
+namespace {
+
+std::uint64_t g_lastTag = 0;
+bool g_marksTaken = false;
+
+} // namespace
+
+tsd_detail::UserGroupMarks::UserGroupMarks() {
+    if (!g_marksTaken) {
+        g_marksTaken = true;
+        m_tag = ++g_lastTag;
+    }
+}
+
+tsd_detail::UserGroupMarks::~UserGroupMarks() {
+    if (m_tag != 0)
+        g_marksTaken = false;
+}
+
+Tsd_PredefGroup* tsd_detail::UserGroupMarks::nextMember(const Tsd_UserGroup* group,
+                                                        std::int32_t& position) {
+    const Tsd_UserGroup::MemberList& includes = group->m_includes;
+    for (; position < includes.count(); ++position)
+        if (Tsd_PredefGroup* member = includes.at(position).group) {
+            ++position;
+            return member;
+        }
+    const Tsd_UserGroup::MemberList* excludes = group->m_excludes.get();
+    for (; excludes != nullptr && position - includes.count() < excludes->count(); ++position)
+        if (Tsd_PredefGroup* member = excludes->at(position - includes.count()).group) {
+            ++position;
+            return member;
+        }
+    return nullptr;
+}
+
+int tsd_detail::CircleSearchState::state(const Tsd_UserGroup* group) const {
+    if (!m_marks.held()) {
+        const int slot = m_table.first(group);
+        return slot < 0 ? kUnknown : slot;
+    }
+    const std::int64_t mark = m_marks.get(group);
+    return mark < 0 ? kUnknown : static_cast<int>(mark);
+}
+
+void tsd_detail::CircleSearchState::set(const Tsd_UserGroup* group, int state) {
+    if (m_marks.held()) {
+        m_marks.set(group, static_cast<std::uint32_t>(state));
+        return;
+    }
+    // A group enters the route from the unknown state only.
+    if (state == kOnRoute)
+        m_table.add(group, kOnRoute);
+    else if (state == kFree)
+        m_table.setFirst(group, kFree);
+    else
+        m_table.remove(group, kOnRoute);
+}
+
 int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchState& state) {
     // A depth-first walk over every route from the group, with an explicit
     // stack so that a long chain of definitions cannot exhaust the call
@@ -217,10 +260,11 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchStat
         return 0;
     int count = 0;
     std::vector<Frame> route;
-    route.emplace_back(start, count);
+    route.push_back(Frame{start, 0, count});
     state.enterRoute(start);
     while (!route.empty()) {
-        Tsd_PredefGroup* member = route.back().nextMember();
+        Tsd_PredefGroup* member =
+            UserGroupMarks::nextMember(route.back().group, route.back().position);
         if (member == nullptr) {
             state.leaveRoute(route.back().group, count == route.back().countOnEntry);
             route.pop_back();
@@ -235,7 +279,7 @@ int tsd_detail::countCircles(Tsd_UserGroup* start, bool report, CircleSearchStat
                 reportCircle(route);
             continue;
         }
-        route.emplace_back(user, count);
+        route.push_back(Frame{user, 0, count});
         state.enterRoute(user);
     }
     return count;
@@ -249,14 +293,21 @@ int Tsd_UserGroup::checkInExcludes(bool report) {
 // --- Tsd_UserGroupIter -----------------------------------------------------
 
 Tsd_UserGroupIter::Tsd_UserGroupIter(const Tsd_UserGroup* group, bool excludes)
-    : m_iter(group == nullptr ? nullptr
-             : excludes       ? &group->m_excludes
+    : m_list(group == nullptr ? nullptr
+             : excludes       ? group->m_excludes.get()
                               : &group->m_includes) {}
 
 Tsd_PredefGroup* Tsd_UserGroupIter::next(Tsd_UserGroup::Edge& edge) {
-    auto* entry = static_cast<Tsd_GroupRef*>(m_iter.next());
-    if (entry == nullptr || entry->getMember() == nullptr)
+    if (m_list == nullptr)
         return nullptr;
-    edge = entry->getEdge();
-    return entry->getMember();
+    // The count is read anew on every call: entries appended during a walk
+    // are visited, and removed ones are skipped.
+    while (m_index < m_list->count()) {
+        const Tsd_UserGroup::Member& entry = m_list->at(m_index++);
+        if (entry.group != nullptr) {
+            edge = entry.edge;
+            return entry.group;
+        }
+    }
+    return nullptr;
 }

@@ -4,14 +4,32 @@
 
 namespace tsd_detail {
 
+namespace {
+
+std::uint64_t g_lastTag = 0;
+bool g_marksTaken = false;
+
+} // namespace
+
 LinkGraph::LinkGraph(const Tsd_BaseObjList& list) : m_list(list) {
     // Number every linked spec of the list and every spec its chain reaches,
     // following each chain only as far as the first spec already numbered.
-    // A spec of the list is numbered by its first slot there, which the
-    // list's own index finds; a spec reached only through links gets a
-    // number after those.
+    // A spec of the list is numbered by its first slot there; a spec reached
+    // only through links gets a number after those.
     m_specs.assign(static_cast<std::size_t>(list.getCount()), nullptr);
     m_next.assign(m_specs.size(), -1);
+    m_listed = list.getCount();
+    if (!g_marksTaken) {
+        g_marksTaken = true;
+        m_tag = ++g_lastTag;
+        // Every spec of the list learns its first slot.
+        for (int i = 0; i < list.getCount(); ++i) {
+            Tsd_BaseObj* obj = list.getAt(i);
+            Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr;
+            if (spec != nullptr && marked(spec) < 0)
+                mark(spec, i);
+        }
+    }
     for (int i = 0; i < list.getCount(); ++i) {
         Tsd_BaseObj* obj = list.getAt(i);
         Tsd_EndpointSpec* spec = obj != nullptr ? obj->getEndpointSpec() : nullptr;
@@ -65,7 +83,40 @@ LinkGraph::LinkGraph(const Tsd_BaseObjList& list) : m_list(list) {
     }
 }
 
+LinkGraph::~LinkGraph() {
+    if (m_tag != 0)
+        g_marksTaken = false;
+}
+
+int LinkGraph::marked(const Tsd_EndpointSpec* spec) const {
+    return spec->m_graphTag == m_tag ? spec->m_graphNode : -1;
+}
+
+void LinkGraph::mark(const Tsd_EndpointSpec* spec, int id) const {
+    spec->m_graphTag = m_tag;
+    spec->m_graphNode = id;
+}
+
 int LinkGraph::number(Tsd_EndpointSpec* spec, bool& added) {
+    if (m_tag != 0) {
+        int id = marked(spec);
+        if (id < 0) {
+            // Outside the list, and met for the first time.
+            id = size();
+            mark(spec, id);
+            m_specs.push_back(spec);
+            m_next.push_back(-1);
+            added = true;
+            return id;
+        }
+        if (id < m_listed) {
+            added = m_specs[static_cast<std::size_t>(id)] == nullptr;
+            m_specs[static_cast<std::size_t>(id)] = spec;
+        } else {
+            added = false;
+        }
+        return id;
+    }
     const int slot = m_list.firstSlotOf(spec);
     if (slot >= 0) {
         added = m_specs[static_cast<std::size_t>(slot)] == nullptr;
@@ -87,6 +138,12 @@ int LinkGraph::idAt(int slot, const Tsd_EndpointSpec* spec) const {
 }
 
 int LinkGraph::idOf(const Tsd_EndpointSpec* spec) const {
+    if (m_tag != 0) {
+        const int id = marked(spec);
+        if (id < 0 || id >= m_listed)
+            return id;
+        return m_specs[static_cast<std::size_t>(id)] != nullptr ? id : -1;
+    }
     const int slot = m_list.firstSlotOf(spec);
     if (slot >= 0)
         return m_specs[static_cast<std::size_t>(slot)] != nullptr ? slot : -1;

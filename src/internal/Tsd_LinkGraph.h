@@ -6,6 +6,7 @@
 #include "tsd/Tsd_BaseObj.h"
 #include "tsd/Tsd_Specs.h"
 
+#include <cstdint>
 #include <vector>
 
 namespace tsd_detail {
@@ -19,6 +20,9 @@ public:
     // The linked endpoint specs of `list` (other objects are passed over)
     // and every spec their links reach.
     explicit LinkGraph(const Tsd_BaseObjList& list);
+    ~LinkGraph();
+    LinkGraph(const LinkGraph&) = delete;
+    LinkGraph& operator=(const LinkGraph&) = delete;
 
     // Nodes are numbered below size(); a number without a spec is no node.
     int size() const { return static_cast<int>(m_specs.size()); }
@@ -47,9 +51,19 @@ public:
 private:
     // The node of `spec`, numbered now if it had none (`added` then true).
     int number(Tsd_EndpointSpec* spec, bool& added);
+    // The node of `spec` as its mark tells: its first slot in the list, or
+    // its number when it is outside; -1 when it has neither.
+    int marked(const Tsd_EndpointSpec* spec) const;
+    void mark(const Tsd_EndpointSpec* spec, int id) const;
 
     const Tsd_BaseObjList& m_list;
     std::vector<Tsd_EndpointSpec*> m_specs;
+    // Each spec's node stands in the spec itself, tagged with this graph, so
+    // a million linked specs need no table. A graph made while another one
+    // holds the marks finds listed specs through the list's own index and
+    // numbers the others in m_unlisted.
+    std::uint64_t m_tag = 0;
+    int m_listed = 0;         // the slots of the list when the graph was made
     Tsd_SlotIndex m_unlisted; // the node of each spec outside the list, as its "slot"
     std::vector<int> m_next;
     std::vector<int> m_cycleOf;

@@ -26,6 +26,9 @@ void noteNameChange() {
 }
 
 bool NameIndex::liveHead(const Tsd_BaseObjList& list, Bucket& bucket) {
+    // Most heads were never cleared: the chain's tail is not even read.
+    if (list.getAt(bucket.head) != nullptr)
+        return true;
     const std::int32_t tail = m_tail[static_cast<std::size_t>(bucket.head)];
     while (bucket.head >= 0 && list.getAt(bucket.head) == nullptr)
         bucket.head = m_next[static_cast<std::size_t>(bucket.head)];
@@ -44,13 +47,21 @@ bool NameIndex::headMatches(const Tsd_BaseObjList& list, const Bucket& bucket,
     return name != nullptr && std::strcmp(name, key) == 0;
 }
 
-void NameIndex::rehash() {
+void NameIndex::rehash(const Tsd_BaseObjList& list) {
     // Sized for the keys still held: buckets whose slots were all cleared
-    // are dropped here, so a list that keeps clearing and appending does
-    // not grow its table.
+    // are dropped here, so a list that keeps clearing and appending (as the
+    // placeholders of forward references do) does not grow its table.
+    // A bucket's head is only known to be cleared once a probe meets it:
+    // when far more buckets claim a key than the list holds pointers, the
+    // heads are looked at first.
     std::size_t live = 1;
     for (const Bucket& bucket : m_table)
         live += bucket.head >= 0 ? 1 : 0;
+    if (live > 2 * static_cast<std::size_t>(list.getLiveCount()) + 1) {
+        live = 1;
+        for (Bucket& bucket : m_table)
+            live += bucket.head >= 0 && liveHead(list, bucket) ? 1 : 0;
+    }
     std::size_t size = 16;
     while (size < 2 * live)
         size *= 2;
@@ -74,7 +85,7 @@ void NameIndex::insert(const Tsd_BaseObjList& list, std::int32_t slot, const cha
     // At most seven buckets in ten taken, counting those whose slots are
     // gone: a small table misses the caches less.
     if (10 * (m_taken + 1) > 7 * m_table.size())
-        rehash();
+        rehash(list);
     const std::uint32_t hash = hashKey(key);
     const std::size_t mask = m_table.size() - 1;
     std::size_t i = hash & mask;

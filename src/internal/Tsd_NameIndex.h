@@ -35,6 +35,10 @@ public:
     // A null key matches nothing.
     Hit find(const Tsd_BaseObjList& list, const char* key);
 
+    // Changes whenever the list changes other than by appending or by
+    // clearing a slot: while it stays, a slot found holds what it held.
+    static std::uint32_t shapeOf(const Tsd_BaseObjList& list) { return list.getShape(); }
+
 private:
     struct Bucket {
         std::uint32_t hash;
@@ -48,7 +52,7 @@ private:
     // Skips the cleared slots at the head of a chain; false when none is left.
     bool liveHead(const Tsd_BaseObjList& list, Bucket& bucket);
     bool headMatches(const Tsd_BaseObjList& list, const Bucket& bucket, const char* key) const;
-    void rehash();
+    void rehash(const Tsd_BaseObjList& list);
 
     KeyOf m_keyOf;
     bool m_built = false;

@@ -112,12 +112,14 @@ bool Tsd_OffsetBonusParser::reduceOffset(const char* text) {
     reset();
     if (text == nullptr)
         return false;
-    std::string body = text;
+    // Most texts never mention the keyword: they are not copied. Only an
+    // 'o' can begin it, a cheap test before the full one.
     bool mentionsOffset = false;
-    for (size_t i = 0; i + 6 <= body.size() && !mentionsOffset; ++i)
-        mentionsOffset = tsd_detail::startsWithNoCase(body.c_str() + i, "OFFSET");
+    for (const char* p = text; *p != 0 && !mentionsOffset; ++p)
+        mentionsOffset = (*p | 0x20) == 'o' && tsd_detail::startsWithNoCase(p, "OFFSET", 6);
     if (!mentionsOffset)
         return false;
+    std::string body = text;
     while (!body.empty() && (body.back() == ';' || body.back() == ' '))
         body.pop_back();
 

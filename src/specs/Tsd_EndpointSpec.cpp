@@ -39,13 +39,8 @@ Tsd_EndpointSpec::Tsd_EndpointSpec(const char* tsid)
 }
 
 Tsd_EndpointSpec::Tsd_EndpointSpec(const Tsd_EndpointSpec& other)
-    : Tsd_Spec(other), m_priority(other.m_priority), m_ignoreGroup(other.m_ignoreGroup),
-      m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {
-    if (other.m_delay != nullptr)
-        m_delay = std::make_unique<Tsd_TimeValue>(*other.m_delay);
-    if (other.m_link != nullptr)
-        m_link = std::make_unique<LinkData>(*other.m_link);
-}
+    : Tsd_Spec(other), m_delayOrLink(other.m_delayOrLink), m_priority(other.m_priority),
+      m_ignoreGroup(other.m_ignoreGroup), m_priorityWrittenAsNone(other.m_priorityWrittenAsNone) {}
 
 Tsd_EndpointSpec::~Tsd_EndpointSpec() = default;
 
@@ -60,20 +55,20 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
     std::vector<const Tsd_EndpointSpec*> chain;
     std::unordered_set<const Tsd_EndpointSpec*> seen;
     const Tsd_EndpointSpec* current = this;
-    while (current->m_delay == nullptr) {
-        if (current->m_link == nullptr || current->m_link->spec == nullptr)
+    while (current->delay() == nullptr) {
+        if (current->link() == nullptr || current->link()->spec == nullptr)
             TSD_MSG().fatal(2, "Unresolved link or ignored spec in getDelayValue() on spec %s\n",
                             current->getTSid());
         if (!seen.insert(current).second)
             TSD_MSG().fatal(2, "Circular TSid link in getDelayValue() on spec %s\n", getTSid());
         chain.push_back(current);
-        current = current->m_link->spec;
+        current = current->link()->spec;
     }
     // Apply the links from the end of the chain back to this spec, as the
     // value is defined: each spec scales the value of the one it links to.
-    Tsd_TimeValue value = *current->m_delay;
+    Tsd_TimeValue value = *current->delay();
     for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
-        const LinkData& link = *(*it)->m_link;
+        const LinkData& link = *(*it)->link();
         if (link.multiply) {
             value.value *= link.factor;
         } else {
@@ -86,29 +81,27 @@ Tsd_TimeValue Tsd_EndpointSpec::getDelayValue() const {
 }
 
 void Tsd_EndpointSpec::setDelayValue(const Tsd_TimeValue& delay) {
-    m_link.reset();
-    m_delay = std::make_unique<Tsd_TimeValue>(delay);
+    m_delayOrLink = delay;
 }
 
 void Tsd_EndpointSpec::setLinkData(Tsd_EndpointSpec* spec, bool multiply, double factor) {
-    m_delay.reset();
-    m_link = std::make_unique<LinkData>(LinkData{spec, multiply, factor});
+    m_delayOrLink = LinkData{spec, multiply, factor};
 }
 
 Tsd_EndpointSpec* Tsd_EndpointSpec::getLinkedSpec() const {
-    return m_link != nullptr ? m_link->spec : nullptr;
+    return link() != nullptr ? link()->spec : nullptr;
 }
 
 bool Tsd_EndpointSpec::isLinkMultiplied() const {
-    return m_link != nullptr && m_link->multiply;
+    return link() != nullptr && link()->multiply;
 }
 
 double Tsd_EndpointSpec::getLinkFactor() const {
-    return m_link != nullptr ? m_link->factor : 0.0;
+    return link() != nullptr ? link()->factor : 0.0;
 }
 
 int Tsd_EndpointSpec::checkLink(bool report) const {
-    if (m_delay != nullptr)
+    if (delay() != nullptr)
         return 0;
     int count = 0;
     Tsd_BaseObjList visited(10); // in the order visited, for the listing
@@ -122,7 +115,7 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
                 tsd_detail::reportIgnoredLink(this, current);
             return count + 1;
         }
-        const LinkData* link = current->m_link.get();
+        const LinkData* link = current->getLinkData();
         if (link == nullptr || link->spec == nullptr)
             TSD_MSG().fatal(2, "NULL link in spec %s.\n", current->getTSid());
         // The list only records addresses; nothing is changed through it.
@@ -143,30 +136,30 @@ int Tsd_EndpointSpec::checkLink(bool report) const {
                 while (Tsd_BaseObj* obj = iter.next()) {
                     const Tsd_EndpointSpec* spec = obj->getEndpointSpec();
                     msg.status("   %s is defined as %s\n", spec->getTSid(),
-                               formatLink(spec->m_link.get(), " "));
+                               formatLink(spec->getLinkData(), " "));
                 }
             }
             return count + 1;
         }
         current = link->spec;
-        if (current->m_delay != nullptr)
+        if (current->delay() != nullptr)
             return count;
     }
 }
 
 const char* Tsd_EndpointSpec::getDelayPropString() const {
     static Tsd_StaticBuf buffer(16, 8);
-    if (m_delay != nullptr) {
-        buffer.copy(m_delay->getString(":"));
-    } else if (m_link != nullptr) {
+    if (delay() != nullptr) {
+        buffer.copy(delay()->getString(":"));
+    } else if (link() != nullptr) {
         // A pending link writes nothing; a TSid that would not read back as
         // a link is quoted.
-        const char* text = formatLink(m_link.get(), "");
+        const char* text = formatLink(getLinkData(), "");
         if (text == nullptr) {
             buffer.clear();
         } else {
             std::string written;
-            const char* tsid = m_link->spec->getTSid();
+            const char* tsid = link()->spec->getTSid();
             tsd_detail::appendLinkTSid(written, tsid);
             written += text + std::strlen(tsid);
             buffer.copy(written.c_str());
@@ -179,15 +172,15 @@ const char* Tsd_EndpointSpec::getDelayPropString() const {
 
 void Tsd_EndpointSpec::dump(DumpStream& stream, short indent) const {
     dumpLine(stream, indent, std::string("Tsd_EndpointSpec ") + orEmpty(getTSid()));
-    if (m_delay != nullptr)
-        dumpLine(stream, indent, "   delay: " + tsd_detail::dumpTime(*m_delay));
+    if (delay() != nullptr)
+        dumpLine(stream, indent, "   delay: " + tsd_detail::dumpTime(*delay()));
     else
         dumpLine(stream, indent, "   delay unset");
-    if (m_link == nullptr) {
+    if (link() == nullptr) {
         dumpLine(stream, indent, "   link unset");
     } else {
         // A pending link, or one to a spec without TSid, has no text.
-        const char* text = formatLink(m_link.get(), "");
+        const char* text = formatLink(getLinkData(), "");
         dumpLine(stream, indent,
                  text != nullptr ? std::string("   link: ") + text
                                  : std::string("   link with NULL TSid pointer"));

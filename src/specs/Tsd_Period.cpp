@@ -26,9 +26,9 @@ Tsd_Period::Tsd_Period(const char* tsid) : Tsd_EndpointSpec(tsid) {}
 Tsd_Period::Tsd_Period(const Tsd_Period& other)
     : Tsd_EndpointSpec(other), m_periodGroup(other.m_periodGroup),
       m_dutyCycleValue(copyOf(other.m_dutyCycleValue)),
-      m_dutyCyclePercent(other.m_dutyCyclePercent), m_dutyCycleHigh(other.m_dutyCycleHigh),
-      m_phase(copyOf(other.m_phase)), m_phasePositive(other.m_phasePositive),
-      m_inputJitter(copyOf(other.m_inputJitter)) {}
+      m_dutyCyclePercent(other.m_dutyCyclePercent), m_phase(copyOf(other.m_phase)),
+      m_inputJitter(copyOf(other.m_inputJitter)), m_dutyCycleHigh(other.m_dutyCycleHigh),
+      m_phasePositive(other.m_phasePositive) {}
 
 Tsd_Period::~Tsd_Period() = default;
 

@@ -3,6 +3,9 @@
 #include "internal/Tsd_Report.h"
 #include "tsd/Tsd_StaticBuf.h"
 
+#include <charconv>
+#include <cmath>
+#include <cstdio>
 #include <cstring>
 #include <string>
 
@@ -86,13 +89,29 @@ bool Tsd_TimeValue::isFrequency(Units units) {
 
 const char* formatNumber(double d) {
     static Tsd_StaticBuf buffer(32, 32);
-    std::string text = formatString("%.9f", d);
-    if (text.find('.') != std::string::npos) {
-        while (!text.empty() && text.back() == '0')
-            text.pop_back();
-        if (!text.empty() && text.back() == '.')
-            text.pop_back();
+    // A whole number prints as its digits: what "%.9f" gives once its zeros
+    // and point are stripped, without the cost of the conversion (a million
+    // specifications are written back at a time). Negative zero keeps "-0".
+    if (std::isfinite(d) && std::fabs(d) < 1e15 && d == std::trunc(d) &&
+        !(d == 0.0 && std::signbit(d))) {
+        char digits[24];
+        const auto end =
+            std::to_chars(digits, digits + sizeof digits - 1, static_cast<long long>(d)).ptr;
+        *end = 0;
+        buffer.copy(digits);
+        return buffer.getBuffer();
     }
-    buffer.copy(text.c_str());
+    // Any double fits: at most 309 integer digits, the point and nine more.
+    char text[400];
+    std::snprintf(text, sizeof text, "%.9f", d);
+    std::size_t length = std::strlen(text);
+    if (std::strchr(text, '.') != nullptr) {
+        while (length > 0 && text[length - 1] == '0')
+            --length;
+        if (length > 0 && text[length - 1] == '.')
+            --length;
+        text[length] = 0;
+    }
+    buffer.copy(text);
     return buffer.getBuffer();
 }
