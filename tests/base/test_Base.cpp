@@ -392,3 +392,62 @@ TEST(AnnoName, QuotesOnlyNamesThatWouldNotReadBack) {
     std::string longName(100, 'n');
     EXPECT_EQ(std::string(Tsd_Util::getAnnoName(longName.c_str())), longName);
 }
+
+// Short texts live inside the string object and longer ones outside: both
+// forms, and the border between them, survive copies, moves and a text set
+// from a part of itself.
+TEST(TsdString, BothFormsSurviveCopiesMovesAndSelfAssignment) {
+    for (std::size_t length : {0, 1, 14, 15, 16, 17, 40}) {
+        SCOPED_TRACE(length);
+        const std::string text(length, 'a');
+        Tsd_String original(text.c_str());
+        EXPECT_EQ(original.get(), text);
+        Tsd_String copy(original);
+        EXPECT_EQ(copy.get(), text);
+        Tsd_String moved(std::move(copy));
+        EXPECT_EQ(moved.get(), text);
+        EXPECT_TRUE(copy.isNull());
+        Tsd_String assigned("x");
+        assigned = std::move(moved);
+        EXPECT_EQ(assigned.get(), text);
+        const Tsd_String& same = assigned;
+        assigned = same; // a copy onto itself keeps the text
+        EXPECT_EQ(assigned.get(), text);
+        if (length > 0) {
+            assigned.set(assigned.get() + 1); // from inside its own text
+            EXPECT_EQ(assigned.get(), text.substr(1));
+        }
+        assigned.set(nullptr);
+        EXPECT_TRUE(assigned.isNull());
+    }
+}
+
+// A list moved away from is empty in every respect, whatever it held, and
+// can be used again.
+TEST(BaseObjList, AMovedFromListIsEmptyAndUsable) {
+    for (int size : {0, 1, 2, 40}) {
+        SCOPED_TRACE(size);
+        std::vector<Plain> objs(static_cast<std::size_t>(size) + 1);
+        Tsd_BaseObjList from;
+        for (int i = 0; i < size; ++i)
+            from.addObj(&objs[static_cast<std::size_t>(i)]);
+        if (size > 0) {
+            EXPECT_TRUE(from.contains(&objs[0])); // builds the index
+        }
+        Tsd_BaseObjList to(std::move(from));
+        EXPECT_EQ(to.getCount(), size);
+        EXPECT_EQ(from.getCount(), 0);
+        EXPECT_TRUE(from.isEmpty());
+        for (int i = 0; i < size; ++i) {
+            EXPECT_FALSE(from.contains(&objs[static_cast<std::size_t>(i)]));
+            EXPECT_TRUE(to.contains(&objs[static_cast<std::size_t>(i)]));
+        }
+        from.addObj(&objs.back());
+        EXPECT_TRUE(from.contains(&objs.back()));
+        EXPECT_EQ(from.getCount(), 1);
+        Tsd_BaseObjList assigned;
+        assigned = std::move(to);
+        EXPECT_EQ(assigned.getCount(), size);
+        EXPECT_TRUE(to.isEmpty());
+    }
+}

@@ -726,11 +726,13 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
     std::unordered_set<Tsd_BaseObj*> trashedObjects;
     // Which object each statement makes is told before trimming hides some.
     std::vector<Tsd_BaseObj*> objects;
-    if (const StatementInput* statements = inputs.statements(0))
-        objects = recordObjects(session, *statements);
+    const bool statementFile = inputs.statements(0) != nullptr;
+    if (statementFile)
+        objects = recordObjects(session, *inputs.statements(0));
     session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
         trashed.push_back({objectClass(obj), objectName(obj), trimReasonText(reason)});
-        trashedObjects.insert(obj);
+        if (statementFile) // only a statement file's writer asks what went
+            trashedObjects.insert(obj);
     };
     session.design().trim();
     session.design().onTrashed = nullptr;
