@@ -717,10 +717,11 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
                  {}});
     }
 
+    // Trimming moves objects to the trash and keeps them: their class and
+    // name are read when the result is written, not copied a million times.
     struct Trashed {
-        const char* cls;
-        std::string name;
-        TrimReasonText why;
+        Tsd_BaseObj* obj;
+        Tsd_Design::TrimReason reason;
     };
     std::vector<Trashed> trashed;
     std::unordered_set<Tsd_BaseObj*> trashedObjects;
@@ -730,7 +731,7 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
     if (statementFile)
         objects = recordObjects(session, *inputs.statements(0));
     session.design().onTrashed = [&](Tsd_BaseObj* obj, Tsd_Design::TrimReason reason) {
-        trashed.push_back({objectClass(obj), objectName(obj), trimReasonText(reason)});
+        trashed.push_back({obj, reason});
         if (statementFile) // only a statement file's writer asks what went
             trashedObjects.insert(obj);
     };
@@ -747,13 +748,15 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
                 .member("records", counts[i])
                 .endObject();
         json.endArray().key("trashed").beginArray();
-        for (const Trashed& entry : trashed)
+        for (const Trashed& entry : trashed) {
+            TrimReasonText why = trimReasonText(entry.reason);
             json.beginObject()
-                .member("class", entry.cls)
-                .member("name", entry.name)
-                .member("reason", entry.why.key)
-                .member("explanation", entry.why.explanation)
+                .member("class", objectClass(entry.obj))
+                .member("name", objectName(entry.obj))
+                .member("reason", why.key)
+                .member("explanation", why.explanation)
                 .endObject();
+        }
         json.endArray();
         writeCanonicalLists(json, session);
         writeDiagnostics(json, session);
@@ -776,11 +779,11 @@ int runTrim(const std::string& file, const std::vector<std::string>& elements,
         }
         for (const Trashed& entry : trashed) {
             out += "# trashed ";
-            out += entry.cls;
+            out += objectClass(entry.obj);
             out += ' ';
-            out += inQuotes(entry.name);
+            out += inQuotes(objectName(entry.obj));
             out += ": ";
-            out += entry.why.explanation;
+            out += trimReasonText(entry.reason).explanation;
             out += eol;
         }
         if (statements != nullptr) {
