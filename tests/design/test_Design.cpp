@@ -3,6 +3,8 @@
 // they replace, on random designs. Trim cascades of built designs are in
 // the builder's scenarios.
 #include "RandomDesigns.h"
+#include "internal/Tsd_GroupCircles.h"
+#include "internal/Tsd_LinkGraph.h"
 
 #include <cstdint>
 #include <cstring>
@@ -374,6 +376,11 @@ TEST(Trim, UserGroupCascadeMatchesRepeatedPasses) {
         RecordingDesign fast, literal;
         fillGroups(seed, fast);
         fillGroups(seed, literal);
+        // Every other design is trimmed while another holder has the
+        // groups' marks: trim then keeps its own tables.
+        std::unique_ptr<tsd_detail::UserGroupMarks> taken;
+        if (seed % 2 != 0)
+            taken = std::make_unique<tsd_detail::UserGroupMarks>();
         EXPECT_EQ(fast.trim(), literalGroupTrim(literal));
         ASSERT_EQ(reported(fast), reported(literal));
         ASSERT_EQ(dumpText(fast), dumpText(literal));
@@ -389,6 +396,12 @@ TEST(Trim, FreezingLinksMatchesWalkingEachChain) {
         fillSpecs(seed, literal);
         std::string fastText, literalText;
         {
+            // Every other design is frozen while another link graph has the
+            // specs' marks: the freezing then keeps its own index.
+            Tsd_BaseObjList none;
+            std::unique_ptr<tsd_detail::LinkGraph> taken;
+            if (seed % 2 != 0)
+                taken = std::make_unique<tsd_detail::LinkGraph>(none);
             MessageCapture capture;
             fastText = fatalText([&] { fast.trim(); }) + capture.sink.transcript();
         }

@@ -2,6 +2,7 @@
 // their properties and dumps (groups.golden), member entries and the search
 // for circular definitions.
 #include "TsdTestSupport.h"
+#include "internal/Tsd_GroupCircles.h"
 
 #include <memory>
 
@@ -109,8 +110,14 @@ TEST(Groups, PredefinedKeywordsAndTNMPatterns) {
 
 namespace {
 
-class CircularGroups : public ::testing::Test {
+// Each case runs twice: with the groups' marks free, and with them taken by
+// another holder, when a search keeps its own table.
+class CircularGroups : public ::testing::TestWithParam<bool> {
 protected:
+    CircularGroups() {
+        if (GetParam())
+            m_taken = std::make_unique<tsd_detail::UserGroupMarks>();
+    }
     UG* group(const std::string& name) {
         m_groups.push_back(std::make_unique<UG>(name.c_str()));
         return m_groups.back().get();
@@ -121,12 +128,13 @@ protected:
     MessageCapture capture;
 
 private:
+    std::unique_ptr<tsd_detail::UserGroupMarks> m_taken;
     std::vector<std::unique_ptr<UG>> m_groups;
 };
 
 } // namespace
 
-TEST_F(CircularGroups, EveryRouteCountsAndIsListedFromWhereTheCheckStarts) {
+TEST_P(CircularGroups, EveryRouteCountsAndIsListedFromWhereTheCheckStarts) {
     UG* q = group("Q");
     UG* r = group("R");
     q->addGroup(r, UG::EDGE_RISING, false);
@@ -156,7 +164,7 @@ TEST_F(CircularGroups, EveryRouteCountsAndIsListedFromWhereTheCheckStarts) {
                                         "   P=Q2:R2\n", "   R2=S\n", "   S=T\n", "   T=S\n"}));
 }
 
-TEST_F(CircularGroups, DeepChainsAndWideLatticesStayCheap) {
+TEST_P(CircularGroups, DeepChainsAndWideLatticesStayCheap) {
     std::vector<UG*> chain;
     for (int i = 0; i < 50000; ++i) { // deeper than a recursive walk could go
         chain.push_back(group("C" + std::to_string(i)));
@@ -180,3 +188,5 @@ TEST_F(CircularGroups, DeepChainsAndWideLatticesStayCheap) {
     }
     EXPECT_EQ(top->checkInExcludes(true), 0);
 }
+
+INSTANTIATE_TEST_SUITE_P(MarksFreeOrTaken, CircularGroups, ::testing::Bool());
