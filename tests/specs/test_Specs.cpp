@@ -290,6 +290,30 @@ TEST(Specs, DelayValuesOfDutyCyclesAndThruIterators) {
     net.setPeriodValue(ns(5));
     EXPECT_FALSE(net.hasMaxSkew() || net.hasMaxDelay());
 
+    // Each optional time reads back what was set, and zero once cleared.
+    Tsd_Period period("TS03");
+    Tsd_GroupOffset offset;
+    const std::vector<std::pair<std::function<void(const TV&)>, std::function<TV()>>> values{
+        {[&](const TV& v) { net.setMaxDelayValue(v); }, [&] { return net.getMaxDelayValue(); }},
+        {[&](const TV& v) { net.setMaxSkewValue(v); }, [&] { return net.getMaxSkewValue(); }},
+        {[&](const TV& v) { net.setPeriodValue(v); }, [&] { return net.getPeriodValue(); }},
+        {[&](const TV& v) { net.setInputJitter(v); }, [&] { return net.getInputJitterValue(); }},
+        {[&](const TV& v) { period.setInputJitter(v); },
+         [&] { return period.getInputJitterValue(); }},
+        {[&](const TV& v) { offset.setOffsetValue(v); }, [&] { return offset.getOffsetValue(); }},
+    };
+    for (std::size_t i = 0; i < values.size(); ++i) {
+        SCOPED_TRACE(i);
+        values[i].first(ns(static_cast<double>(i) + 1));
+        EXPECT_DOUBLE_EQ(values[i].second().value, static_cast<double>(i) + 1);
+    }
+    net.clearInputJitter();
+    period.clearInputJitter();
+    offset.removeOffsetValue();
+    for (std::size_t i = 3; i < values.size(); ++i)
+        EXPECT_EQ(values[i].second().value, 0.0);
+    EXPECT_EQ(offset.getDataValidValue().value, 0.0);
+
     Tsd_ThruGroup t1("t1"), t2("t2");
     Tsd_DelayPath p("TS01");
     EXPECT_EQ(p.createThruIter(), nullptr);
