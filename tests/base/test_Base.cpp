@@ -1,6 +1,7 @@
 // The foundation: pointer lists and their index, reference records and their
 // owners, the object base, and the text buffers.
 #include "TsdTestSupport.h"
+#include "internal/Tsd_ObjText.h"
 
 #include <algorithm>
 #include <functional>
@@ -385,6 +386,13 @@ TEST(AnnoName, QuotesOnlyNamesThatWouldNotReadBack) {
     for (const auto& c : cases)
         EXPECT_STREQ(Tsd_Util::getAnnoName(c[0]), c[1]) << "name: " << c[0];
     EXPECT_STREQ(Tsd_Util::getAnnoName(nullptr), "\"\"");
+    // The comparisons under every keyword test take a missing text as no match.
+    EXPECT_TRUE(tsd_detail::equalsNoCase(nullptr, nullptr));
+    EXPECT_FALSE(tsd_detail::equalsNoCase("a", nullptr) || tsd_detail::equalsNoCase(nullptr, "a"));
+    EXPECT_FALSE(tsd_detail::startsWithNoCase(nullptr, "TS") ||
+                 tsd_detail::startsWithNoCase("TS01", nullptr) ||
+                 tsd_detail::startsWithNoCase("T", "TS"));
+    EXPECT_TRUE(tsd_detail::startsWithNoCase("ts01", "TS"));
     // Valid until the next call, whatever the length.
     const char* first = Tsd_Util::getAnnoName("alpha");
     Tsd_Util::getAnnoName("*beta");
