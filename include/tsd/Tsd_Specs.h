@@ -136,7 +136,7 @@ private:
     const Tsd_TimeValue* delay() const { return std::get_if<Tsd_TimeValue>(&m_delayOrLink); }
     const LinkData* link() const { return getLinkData(); }
 
-    // Held in the spec, at most one of the two.
+    // Held in this object, at most one of the two.
     std::variant<std::monostate, Tsd_TimeValue, LinkData> m_delayOrLink;
     std::int32_t m_priority;
     // This spec's node in the link graph being built, tagged with that

@@ -1,6 +1,6 @@
 // The TSid links among endpoint specs as a graph, and the messages of the
-// link check, shared by the spec's own check and the builder's check of a
-// whole design.
+// link check, shared by an endpoint specification's own check and the
+// builder's check of a whole design.
 #pragma once
 
 #include "tsd/Tsd_BaseObj.h"
@@ -58,8 +58,8 @@ private:
 
     const Tsd_BaseObjList& m_list;
     std::vector<Tsd_EndpointSpec*> m_specs;
-    // Each spec's node stands in the spec itself, tagged with this graph, so
-    // a million linked specs need no table. A graph made while another one
+    // Each specification's node stands in that object, tagged with this
+    // graph, so a million linked specs need no table. A graph made while another one
     // holds the marks finds listed specs through the list's own index and
     // numbers the others in m_unlisted.
     std::uint64_t m_tag = 0;

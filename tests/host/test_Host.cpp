@@ -9,6 +9,9 @@
 using namespace tsd_test;
 
 TEST(Format, ConversionsWideStringsAndMalformedInput) {
+    // An unpaired high surrogate, and a low one alone.
+    const char16_t highAlone[] = {u'a', static_cast<char16_t>(0xD800), 0};
+    const char16_t lowAlone[] = {static_cast<char16_t>(0xDC00), 0};
     const struct {
         std::string actual;
         const char* expected;
@@ -27,7 +30,7 @@ TEST(Format, ConversionsWideStringsAndMalformedInput) {
         // Non-ASCII text and a surrogate pair come out as UTF-8; an unpaired
         // surrogate is replaced, never read past.
         {formatMessage("%z", u"\u00e9\U0001F600"), "\xc3\xa9\xf0\x9f\x98\x80"},
-        {formatMessage("%z|%z", u"a\xd800", u"\xdc00"), "a\xef\xbf\xbd|\xef\xbf\xbd"},
+        {formatMessage("%z|%z", highAlone, lowAlone), "a\xef\xbf\xbd|\xef\xbf\xbd"},
         {formatMessage("%s|%z", static_cast<const char*>(nullptr),
                        static_cast<const char16_t*>(nullptr)),
          "(null)|(null)"},
