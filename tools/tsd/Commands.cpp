@@ -321,6 +321,15 @@ std::vector<Tsd_BaseObj*> recordObjects(Session& session, const StatementInput& 
     // records.
     std::vector<std::size_t> offsetRecords;
     std::vector<std::size_t> controlRecords;
+    // A TIMESPEC whose value is a group offset makes an offset, whatever
+    // spec its TSid names; a TSid met twice stands for its first record.
+    auto isOffsetValue = [](const std::string& value) {
+        for (const std::string& word : valueWords(value))
+            if (equalsNoCase(word, "OFFSET"))
+                return true;
+        return false;
+    };
+    std::unordered_set<Tsd_BaseObj*> taken;
     for (std::size_t i = 0; i < records.size(); ++i) {
         const PropRecord& prop = records[i].prop;
         if (prop.kind == PropKind::Group) {
@@ -328,9 +337,11 @@ std::vector<Tsd_BaseObj*> recordObjects(Session& session, const StatementInput& 
         } else if (prop.kind == PropKind::Spec) {
             if (equalsNoCase(prop.name, "ENABLE") || equalsNoCase(prop.name, "DISABLE"))
                 controlRecords.push_back(i);
+            else if (isOffsetValue(prop.value))
+                offsetRecords.push_back(i);
             else if (Tsd_EndpointSpec* spec =
                          design.findEndpointSpecByTSid(prop.name.c_str(), false))
-                objects[i] = spec;
+                objects[i] = taken.insert(spec).second ? spec : nullptr;
             else
                 offsetRecords.push_back(i);
         }
