@@ -1,5 +1,6 @@
 #include "Session.h"
 
+#include "Hints.h"
 #include "Pages.h"
 #include "Statements.h"
 
@@ -20,17 +21,7 @@ namespace tsd_cli {
 namespace {
 
 bool startsWithNoCase(std::string_view text, std::string_view prefix) {
-    if (text.size() < prefix.size())
-        return false;
-    for (std::size_t i = 0; i < prefix.size(); ++i)
-        if (std::toupper(static_cast<unsigned char>(text[i])) !=
-            std::toupper(static_cast<unsigned char>(prefix[i])))
-            return false;
-    return true;
-}
-
-bool equalsNoCase(std::string_view a, std::string_view b) {
-    return a.size() == b.size() && startsWithNoCase(a, b);
+    return text.size() >= prefix.size() && equalsNoCase(text.substr(0, prefix.size()), prefix);
 }
 
 // "DROP_SPEC", in any case, with an optional ':' before the end.
