@@ -194,9 +194,14 @@ void Session::load(std::vector<InputFile> inputs) {
 void Session::load(std::vector<InputFile> inputs, const FileReader& reader) {
     m_displayFile = inputs.size() == 1 ? inputs.front().displayName : std::string();
     std::size_t lines = 0;
-    for (const InputFile& input : inputs)
+    std::size_t bytes = 0;
+    for (const InputFile& input : inputs) {
         lines +=
             static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
+        bytes += input.text.size();
+    }
+    // A design takes up to about eight times the room of its text.
+    prepareHeap(bytes * 8);
     // An upper bound: the pages of lines without a property are never touched.
     m_store.reserve(m_store.size() + lines);
     const std::vector<StoredProp>& records = m_store.records();
