@@ -239,3 +239,69 @@ TEST(Builder, DeepChainsAndWideGroupsBuildTrimAndDump) {
         EXPECT_GT(counter.count, std::size_t(n));
     }
 }
+
+namespace {
+
+// Enough stored properties to fill several blocks of text.
+constexpr int kMore = 3000;
+
+// Group names of a few dozen characters; the 1000th is longer than a block.
+std::string longName(char first, int i) {
+    std::string name(1, first);
+    name += std::to_string(i);
+    name.append(i == 1000 ? 70000 : 30, 'x');
+    return name;
+}
+
+} // namespace
+
+// A hook may store more properties while the build processes the stored
+// ones: they are processed after them, in order, across the blocks that
+// hold their texts and through one text longer than a block.
+TEST(Builder, PropertiesStoredByAHookDuringTheBuildAreProcessedInOrder) {
+    class GrowingBuilder : public Tsd_Builder {
+    public:
+        int groupsAdded = 0;
+        int specsAdded = 0;
+
+    protected:
+        Tsd_PredefGroup* getPredefGroupForGroup(const char* name) override {
+            // "u<i>" names "v<i>", which the hook then defines.
+            if (name[0] == 'v' && groupsAdded < kMore)
+                addUserGroupProp(name, longName('t', ++groupsAdded).c_str());
+            return Tsd_Builder::getPredefGroupForGroup(name);
+        }
+        Tsd_TermGroup* getTermGroupForSpec(const char* name) override {
+            // Each period defines the next, each on a group of its own.
+            if (specsAdded < kMore) {
+                ++specsAdded;
+                addSpecProp(("TS" + std::to_string(specsAdded)).c_str(),
+                            ("PERIOD " + longName('t', specsAdded) + " 10 ns").c_str());
+            }
+            return Tsd_Builder::getTermGroupForSpec(name);
+        }
+    };
+    PropSet set;
+    for (int i = 1; i <= kMore; ++i)
+        set.refs.push_back({"e" + std::to_string(i), "TS_TNM", longName('t', i)});
+    for (int i = 1; i <= kMore; ++i)
+        set.groups.emplace_back("u" + std::to_string(i), "v" + std::to_string(i));
+    set.specs = {{"TS0", "PERIOD " + longName('t', 1) + " 10 ns"}};
+    MessageCapture capture;
+    GrowingBuilder builder;
+    Built built = build(set, builder);
+    ASSERT_NE(built.design, nullptr) << capture.sink.transcript().substr(0, 2000);
+    EXPECT_EQ(builder.groupsAdded, kMore);
+    EXPECT_EQ(builder.specsAdded, kMore);
+    // Every group the hook stored was defined, so no "v" stayed unresolved,
+    // and each spec it stored was built, in the order stored.
+    EXPECT_TRUE(capture.sink.records.empty()) << capture.sink.transcript().substr(0, 2000);
+    const Tsd_BaseObjList* specs = built.design->getEndpointSpecList();
+    ASSERT_EQ(specs->getCount(), kMore + 1);
+    for (int i = 0; i <= kMore; ++i) {
+        const Tsd_Period* period = specs->getAt(i)->getEndpointSpec()->getPeriod();
+        ASSERT_NE(period, nullptr) << i;
+        EXPECT_EQ(std::string(period->getTSid()), "TS" + std::to_string(i));
+        EXPECT_EQ(std::string(period->getPeriodGroup()->getName()), longName('t', i == 0 ? 1 : i));
+    }
+}
