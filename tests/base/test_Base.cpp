@@ -71,15 +71,23 @@ TEST(RefList, SlotsHolesAndTheSingleReference) {
 }
 
 TEST(RefList, DeleteAllRefsDestroysEachReferenceOnce) {
-    int destroyed = 0;
-    auto* a = new NamedRef("a", &destroyed);
-    Tsd_RefList list;
-    list.addRef(a);
-    list.addRef(new NamedRef("b", &destroyed));
-    list.addRef(a); // added twice by hand
-    list.deleteAllRefs();
-    EXPECT_EQ(destroyed, 2);
-    EXPECT_EQ(list.getCount(), 0);
+    // Short and long lists (sorted by different means), references added
+    // again by hand far from their first place.
+    for (int distinct : {2, 5000}) {
+        SCOPED_TRACE(distinct);
+        int destroyed = 0;
+        std::vector<NamedRef*> refs;
+        Tsd_RefList list;
+        for (int i = 0; i < distinct; ++i) {
+            refs.push_back(new NamedRef("r" + std::to_string(i), &destroyed));
+            list.addRef(refs.back());
+        }
+        for (int i : {0, distinct - 1, 0, distinct / 2})
+            list.addRef(refs[static_cast<std::size_t>(i)]);
+        list.deleteAllRefs();
+        EXPECT_EQ(destroyed, distinct);
+        EXPECT_EQ(list.getCount(), 0);
+    }
 }
 
 TEST(BaseObjList, WalksSkipHolesAndSeeRemovalsAndAppendsDuringTheWalk) {
