@@ -13,8 +13,11 @@
 #   SHAPE_N  the length or width of the adversarial shapes (default 1000000)
 #   TIMEOUT  seconds before a run of the mix is given up and shown as such
 #            (default 600)
-#   SHAPE_TIMEOUT  the same for the adversarial shapes (default 120)
+#   SHAPE_TIMEOUT  the same for the adversarial shapes (default 120), for
+#            each run
 #   SEED     the generator's seed (default 1)
+#   RUNS     timed runs of each command, after one warm-up; the table shows
+#            the run with the median wall clock (default 3)
 #   WORK     where the inputs go (default build/bench-data)
 #
 # The tool and the generator are built optimised in build/release. Wall
@@ -29,6 +32,7 @@ shape_n=${SHAPE_N:-1000000}
 mix_timeout=${TIMEOUT:-600}
 shape_timeout=${SHAPE_TIMEOUT:-120}
 seed=${SEED:-1}
+runs_n=${RUNS:-3}
 work=${WORK:-build/bench-data}
 
 bash scripts/setup-deps.sh
@@ -45,30 +49,42 @@ echo "tool: $tsd ($(git rev-parse --short HEAD 2>/dev/null || echo 'no git'))"
 echo "load average at the start: $(cut -d' ' -f1-3 /proc/loadavg)"
 echo
 
-# Runs one command under /usr/bin/time; sets `secs` (wall clock), `cpu`
-# (user and system seconds: on a busy machine the steadier figure) and
-# `rss_kb`, or secs=timeout when it did not finish in time. Fails on any
-# other error.
+# Runs one command under /usr/bin/time, once to warm up and then RUNS
+# times; sets `secs` (wall clock), `cpu` (user and system seconds: on a busy
+# machine the steadier figure) and `rss_kb` of the run with the median wall
+# clock, or secs=timeout when a run did not finish in time. Fails on any
+# other error. The warm-up is not counted: on a virtual machine, the first
+# touch of memory that another program (the generator) just gave back can
+# cost the next program more than its own work.
 measure() {
     local log="$work/time.log"
     echo "\$ $*"
-    local status=0
-    timeout "$timeout_s" /usr/bin/time -v -o "$log" "$@" >/dev/null 2>"$work/stderr.log" || status=$?
-    if [ "$status" -eq 124 ]; then
-        secs=timeout
-        cpu=-
-        rss_kb=-
-        return
-    fi
-    if [ "$status" -ne 0 ]; then
-        echo "bench: the command failed ($status):" >&2
-        head -5 "$work/stderr.log" >&2
-        exit 1
-    fi
-    secs=$(awk -F': ' '/Elapsed \(wall clock\)/ {
-        n = split($2, p, ":"); s = 0; for (i = 1; i <= n; i++) s = s * 60 + p[i]; print s }' "$log")
-    cpu=$(awk -F': ' '/User time|System time/ {s += $2} END {printf "%.2f", s}' "$log")
-    rss_kb=$(awk -F': ' '/Maximum resident set size/ {print $2}' "$log")
+    local runs=() run status
+    for ((run = 0; run <= runs_n; run++)); do
+        status=0
+        timeout "$timeout_s" /usr/bin/time -v -o "$log" "$@" >/dev/null 2>"$work/stderr.log" ||
+            status=$?
+        if [ "$status" -eq 124 ]; then
+            secs=timeout
+            cpu=-
+            rss_kb=-
+            return
+        fi
+        if [ "$status" -ne 0 ]; then
+            echo "bench: the command failed ($status):" >&2
+            head -5 "$work/stderr.log" >&2
+            exit 1
+        fi
+        [ "$run" -eq 0 ] && continue
+        runs+=("$(awk -F': ' '
+            /Elapsed \(wall clock\)/ {
+                n = split($2, p, ":"); s = 0; for (i = 1; i <= n; i++) s = s * 60 + p[i] }
+            /User time|System time/ { c += $2 }
+            /Maximum resident set size/ { r = $2 }
+            END { printf "%s %.2f %s", s, c, r }' "$log")")
+    done
+    read -r secs cpu rss_kb < <(printf '%s\n' "${runs[@]}" | sort -n -k1,1 |
+        sed -n "$(((runs_n + 1) / 2))p")
 }
 
 row() { printf '%-16s %9s %7s %-10s %9s %9s %9s %11s %13s\n' "$@"; }

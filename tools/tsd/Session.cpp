@@ -200,8 +200,9 @@ void Session::load(std::vector<InputFile> inputs, const FileReader& reader) {
             static_cast<std::size_t>(std::count(input.text.begin(), input.text.end(), '\n')) + 1;
         bytes += input.text.size();
     }
-    // A design takes up to about eight times the room of its text.
-    prepareHeap(bytes * 8);
+    // A design of property lines takes up to about eight times the room of
+    // its text, one of statements up to about sixteen times.
+    prepareHeap(bytes * 16);
     // An upper bound: the pages of lines without a property are never touched.
     m_store.reserve(m_store.size() + lines);
     const std::vector<StoredProp>& records = m_store.records();
