@@ -67,7 +67,7 @@ void adviseLargePages(const void* data, std::size_t size) {
 
 void prepareHeap(std::size_t expected) {
 #if defined(__linux__) && defined(__GLIBC__) && defined(MADV_HUGEPAGE) && !defined(TSD_POOL_POISON)
-    constexpr std::size_t kWorthIt = std::size_t(64) << 20;
+    constexpr std::size_t kWorthIt = std::size_t(16) << 20;
     constexpr std::size_t kMost = std::size_t(1) << 30; // the pad is an int
     static bool prepared = false;
     if (prepared || expected < kWorthIt)

@@ -16,9 +16,10 @@ void adviseLargePages(const void* data, std::size_t size);
 // Readies the general heap for about `expected` bytes of small objects,
 // which the design's objects and indexes are: on Linux with the GNU C
 // library, the heap grows once by that much and offers it large pages,
-// since a page fault per 4 KiB costs a large design a quarter of its time.
-// Does nothing for a small expectation, under AddressSanitizer (which has
-// its own heap) and where it does not apply.
+// since a page fault per 4 KiB costs a large design a quarter of its time
+// or more. Does nothing below 16 MiB (an input below a megabyte), after the
+// first call, under AddressSanitizer (which has its own heap) and where it
+// does not apply.
 void prepareHeap(std::size_t expected);
 
 // Reserves room for `count` elements of `buffer` (a std::vector or
