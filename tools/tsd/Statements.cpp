@@ -929,6 +929,7 @@ private:
                     namesDropped.push_back(!kept(r));
                 }
                 removeFromList(names, namesDropped);
+                requoteMovedToStart(item, namesDropped);
             }
         }
         removeFromList(spans, dropped);
@@ -954,6 +955,30 @@ private:
                 addRemoval(spans[i - 1].second, spans[j].second, true);
             i = j + 1;
         }
+    }
+
+    // The first name kept after dropped ones moves to the start of its list,
+    // which starts a word: there a single quote opens a quoted name, while
+    // inside "T1,'T2" it does not. Such a name is written in full quotes.
+    void requoteMovedToStart(const StatementItem& item, const std::vector<bool>& namesDropped) {
+        std::size_t first = 0;
+        while (first < namesDropped.size() && namesDropped[first])
+            ++first;
+        if (first == 0 || first == namesDropped.size())
+            return;
+        const std::size_t r = item.firstRecord + first;
+        const StatementRecord& record = m_file.records[r];
+        const bool leadingQuote = m_text[record.valueBegin] == '\'' &&
+                                  record.prop.value.size() == record.valueEnd - record.valueBegin;
+        // A replaced value is written in full already.
+        if (!leadingQuote || m_outputs[r].value != record.prop.value)
+            return;
+        Edit edit;
+        if (!statementName(record.prop.value, edit.with))
+            return;
+        edit.begin = record.valueBegin;
+        edit.end = record.valueEnd;
+        m_edits.push_back(std::move(edit));
     }
 
     void addRemoval(std::size_t begin, std::size_t end, bool lineHasText) {
