@@ -222,11 +222,13 @@ TEST(Statements, WriterKeepsReplacesAndRemoves) {
         {"NET a LOC = P1 |\n  TNM = g | TIG | KEEP;", "dd", "NET a LOC = P1 | KEEP;"},
         {"NET a TIG = T1, T2,\n  T3;", "kdd", "NET a TIG = T1;"},
         {"NET a TIG = T1, T2, T3;", "dkr", "NET a TIG = T2, R;"},
-        // A name brought to the start of the list, and so of a word, where a
-        // single quote would open a quoted name.
+        // A name whose single quote is not closed runs to the end of its
+        // word: once others go, it could start the word (where the quote
+        // opens a quoted name) or run into the names after it.
         {"NET a TIG = T1,'T2;", "dk", "NET a TIG = \"'T2\";"},
         {"NET a TIG = T1, T2,'T3 | KEEP;", "ddk", "NET a TIG = \"'T3\" | KEEP;"},
-        {"NET a TIG = T1,T2,'T3;", "kdk", "NET a TIG = T1,'T3;"},
+        {"NET a TIG = T1,'T2 T3,'T4;", "kkdk", "NET a TIG = T1,\"'T2\",\"'T4\";"},
+        {"NET a TIG = T1,'T2 T3;", "kkk", "NET a TIG = T1,'T2 T3;"},
         {"NET a TIG | TNM = \"g\";", "rk", "NET a TIG = R | TNM = \"g\";"},
         // Whole statements take their line, a trailing comment and line end.
         {"# top\n  NET a TNM = g; # a\nNET b TNM = h;\n", "dk", "# top\nNET b TNM = h;\n"},

@@ -929,7 +929,7 @@ private:
                     namesDropped.push_back(!kept(r));
                 }
                 removeFromList(names, namesDropped);
-                requoteMovedToStart(item, namesDropped);
+                requoteOpenQuotes(item, namesDropped);
             }
         }
         removeFromList(spans, dropped);
@@ -957,28 +957,28 @@ private:
         }
     }
 
-    // The first name kept after dropped ones moves to the start of its list,
-    // which starts a word: there a single quote opens a quoted name, while
-    // inside "T1,'T2" it does not. Such a name is written in full quotes.
-    void requoteMovedToStart(const StatementItem& item, const std::vector<bool>& namesDropped) {
-        std::size_t first = 0;
-        while (first < namesDropped.size() && namesDropped[first])
-            ++first;
-        if (first == 0 || first == namesDropped.size())
+    // A name that begins with a single quote it does not close, as 'T2 in
+    // "T1,'T2", runs to the end of its word. Once names around it are
+    // dropped it may start the word, where the quote would open a quoted
+    // name, or run into the names after it: it is written in double quotes.
+    void requoteOpenQuotes(const StatementItem& item, const std::vector<bool>& namesDropped) {
+        if (std::none_of(namesDropped.begin(), namesDropped.end(), [](bool d) { return d; }))
             return;
-        const std::size_t r = item.firstRecord + first;
-        const StatementRecord& record = m_file.records[r];
-        const bool leadingQuote = m_text[record.valueBegin] == '\'' &&
-                                  record.prop.value.size() == record.valueEnd - record.valueBegin;
-        // A replaced value is written in full already.
-        if (!leadingQuote || m_outputs[r].value != record.prop.value)
-            return;
-        Edit edit;
-        if (!statementName(record.prop.value, edit.with))
-            return;
-        edit.begin = record.valueBegin;
-        edit.end = record.valueEnd;
-        m_edits.push_back(std::move(edit));
+        for (std::size_t i = 0; i < namesDropped.size(); ++i) {
+            const std::size_t r = item.firstRecord + i;
+            const StatementRecord& record = m_file.records[r];
+            const bool openQuote = m_text[record.valueBegin] == '\'' &&
+                                   record.prop.value.size() == record.valueEnd - record.valueBegin;
+            // A replaced value is written in full already.
+            if (namesDropped[i] || !openQuote || m_outputs[r].value != record.prop.value)
+                continue;
+            Edit edit;
+            if (!statementName(record.prop.value, edit.with))
+                continue;
+            edit.begin = record.valueBegin;
+            edit.end = record.valueEnd;
+            m_edits.push_back(std::move(edit));
+        }
     }
 
     void addRemoval(std::size_t begin, std::size_t end, bool lineHasText) {
