@@ -191,6 +191,12 @@ TEST(Statements, MalformedStatementsSayWhereAndReadingGoesOn) {
          "\"TIG\" "
          "(is a \"|\" missing between two attributes?)",
          0},
+        // In a list, a name that opens a single quote closes it in its word
+        // (a double quote must close on its line, as anywhere).
+        {"NET a TIG = T1,'T2 T3 | TNM = g;",
+         "1:16 unterminated quote: a name of the list opens a quote that its word does not "
+         "close",
+         3},
         // The quote ends its statement with its line; the next line reads.
         {"NET \"a TNM = g; NET b TNM = h;\nNET c TNM = i;",
          "1:5 unterminated quote: a quoted name must end on the line it begins on", 1},
@@ -222,13 +228,8 @@ TEST(Statements, WriterKeepsReplacesAndRemoves) {
         {"NET a LOC = P1 |\n  TNM = g | TIG | KEEP;", "dd", "NET a LOC = P1 | KEEP;"},
         {"NET a TIG = T1, T2,\n  T3;", "kdd", "NET a TIG = T1;"},
         {"NET a TIG = T1, T2, T3;", "dkr", "NET a TIG = T2, R;"},
-        // A name whose single quote is not closed runs to the end of its
-        // word: once others go, it could start the word (where the quote
-        // opens a quoted name) or run into the names after it.
-        {"NET a TIG = T1,'T2;", "dk", "NET a TIG = \"'T2\";"},
-        {"NET a TIG = T1, T2,'T3 | KEEP;", "ddk", "NET a TIG = \"'T3\" | KEEP;"},
-        {"NET a TIG = T1,'T2 T3,'T4;", "kkdk", "NET a TIG = T1,\"'T2\",\"'T4\";"},
-        {"NET a TIG = T1,'T2 T3;", "kkk", "NET a TIG = T1,'T2 T3;"},
+        // A quoted name of a list keeps its quotes wherever it moves.
+        {"NET a TIG = T1,'T2' T3,'T,4';", "dkdk", "NET a TIG = 'T2','T,4';"},
         {"NET a TIG | TNM = \"g\";", "rk", "NET a TIG = R | TNM = \"g\";"},
         // Whole statements take their line, a trailing comment and line end.
         {"# top\n  NET a TNM = g; # a\nNET b TNM = h;\n", "dk", "# top\nNET b TNM = h;\n"},

@@ -44,6 +44,10 @@ std::string unterminatedQuote() {
     return "unterminated quote: a quoted name must end on the line it begins on";
 }
 
+std::string unclosedInList() {
+    return "unterminated quote: a name of the list opens a quote that its word does not close";
+}
+
 std::string missingSemicolon(int nextLine) {
     std::string text = "missing \";\" at the end of the statement";
     if (nextLine > 0)
@@ -802,22 +806,35 @@ private:
             std::size_t i = token.begin;
             while (i < token.end) {
                 std::size_t start = i;
+                bool open = false;
                 while (i < token.end && m_text[i] != ',') {
                     char c = m_text[i];
                     if (c == '"' || (c == '\'' && i == start)) {
                         std::size_t close = m_text.find(c, i + 1);
-                        i = close < token.end ? close + 1 : token.end;
+                        open = close >= token.end;
+                        i = open ? token.end : close + 1;
                     } else {
                         ++i;
                     }
                 }
-                if (i > start)
+                // A name of the list that opens a single quote closes it
+                // within its word, as a name at the start of a word must:
+                // else dropping the names before it would change how it
+                // reads.
+                if (open)
+                    error(itemPos(token, start), msg::unclosedInList());
+                else if (i > start)
                     addTig(timing, attribute, tokens[a], token, start, i);
                 ++i; // the comma
             }
         }
         if (m_file.statements.back().recordCount == before)
             error(tokens[valueAt].pos, msg::noValue(attribute));
+    }
+
+    // Where byte `at` of a token stands: tokens do not span lines.
+    static TextPos itemPos(const Token& token, std::size_t at) {
+        return {token.pos.line, token.pos.column + static_cast<int>(at - token.begin)};
     }
 
     void addTig(const TimingAttribute& timing, const std::string& attribute, const Token& at,
@@ -831,8 +848,7 @@ private:
         record.prop.value = std::string(quoted ? text.substr(1, text.size() - 2) : text);
         record.valueBegin = begin;
         record.valueEnd = end;
-        record.valueWhere = {token.pos.line,
-                             token.pos.column + static_cast<int>(begin - token.begin)};
+        record.valueWhere = itemPos(token, begin);
         if (record.prop.value.empty())
             error(record.valueWhere, msg::emptyName());
     }
@@ -929,7 +945,6 @@ private:
                     namesDropped.push_back(!kept(r));
                 }
                 removeFromList(names, namesDropped);
-                requoteOpenQuotes(item, namesDropped);
             }
         }
         removeFromList(spans, dropped);
@@ -954,30 +969,6 @@ private:
             else
                 addRemoval(spans[i - 1].second, spans[j].second, true);
             i = j + 1;
-        }
-    }
-
-    // A name that begins with a single quote it does not close, as 'T2 in
-    // "T1,'T2", runs to the end of its word. Once names around it are
-    // dropped it may start the word, where the quote would open a quoted
-    // name, or run into the names after it: it is written in double quotes.
-    void requoteOpenQuotes(const StatementItem& item, const std::vector<bool>& namesDropped) {
-        if (std::none_of(namesDropped.begin(), namesDropped.end(), [](bool d) { return d; }))
-            return;
-        for (std::size_t i = 0; i < namesDropped.size(); ++i) {
-            const std::size_t r = item.firstRecord + i;
-            const StatementRecord& record = m_file.records[r];
-            const bool openQuote = m_text[record.valueBegin] == '\'' &&
-                                   record.prop.value.size() == record.valueEnd - record.valueBegin;
-            // A replaced value is written in full already.
-            if (namesDropped[i] || !openQuote || m_outputs[r].value != record.prop.value)
-                continue;
-            Edit edit;
-            if (!statementName(record.prop.value, edit.with))
-                continue;
-            edit.begin = record.valueBegin;
-            edit.end = record.valueEnd;
-            m_edits.push_back(std::move(edit));
         }
     }
 
