@@ -228,6 +228,9 @@ TEST(Statements, WriterKeepsReplacesAndRemoves) {
         {"NET a LOC = P1 |\n  TNM = g | TIG | KEEP;", "dd", "NET a LOC = P1 | KEEP;"},
         {"NET a TIG = T1, T2,\n  T3;", "kdd", "NET a TIG = T1;"},
         {"NET a TIG = T1, T2, T3;", "dkr", "NET a TIG = T2, R;"},
+        // A name ending in "/" does not run into a comment after a dropped one.
+        {"NET a TIG = /, T// c\n;", "kd", "NET a TIG = / // c\n;"},
+        {"NET a TIG = / | TNM = g# c\n;", "kd", "NET a TIG = / # c\n;"},
         // A quoted name of a list keeps its quotes wherever it moves.
         {"NET a TIG = T1,'T2' T3,'T,4';", "dkdk", "NET a TIG = 'T2','T,4';"},
         {"NET a TIG | TNM = \"g\";", "rk", "NET a TIG = R | TNM = \"g\";"},

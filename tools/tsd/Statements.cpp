@@ -864,7 +864,7 @@ struct Edit {
     std::size_t begin = 0;
     std::size_t end = 0;
     std::string with;
-    bool removal = false;    // keeps the comments that stand on lines of their own
+    bool removal = false;    // keeps the comments that stand on lines of their own, then `with`
     bool lineHasText = true; // something stands before `begin` on its line
 };
 
@@ -893,8 +893,7 @@ public:
             out.append(m_text.substr(cursor, edit.begin - cursor));
             if (edit.removal)
                 appendKeptComments(out, edit);
-            else
-                out += edit.with;
+            out += edit.with;
             cursor = edit.end;
         }
         out.append(m_text.substr(cursor));
@@ -964,10 +963,16 @@ private:
             std::size_t j = i;
             while (j + 1 < spans.size() && dropped[j + 1])
                 ++j;
-            if (i == 0)
+            if (i == 0) {
                 addRemoval(spans[i].first, spans[j + 1].first, true);
-            else
-                addRemoval(spans[i - 1].second, spans[j].second, true);
+            } else {
+                const std::size_t end = spans[j].second;
+                addRemoval(spans[i - 1].second, end, true);
+                // A comment right after the run keeps a blank before it: a
+                // name ending in "/" would run into a "//" and be lost.
+                if (end < m_text.size() && commentAt(m_text, end, m_text.size()))
+                    m_edits.back().with = " ";
+            }
             i = j + 1;
         }
     }
