@@ -231,6 +231,10 @@ TEST(Statements, WriterKeepsReplacesAndRemoves) {
         // A name ending in "/" does not run into a comment after a dropped one.
         {"NET a TIG = /, T// c\n;", "kd", "NET a TIG = / // c\n;"},
         {"NET a TIG = / | TNM = g# c\n;", "kd", "NET a TIG = / # c\n;"},
+        // A name that comes to the start of a line does not begin a statement.
+        {"INST a TIG =\n  T1 INST b c;", "dkkk", "INST a TIG =\n  \"INST\" b c;"},
+        {"INST a TIG =\n  T1 Inst b c;", "dkrk", "INST a TIG =\n  \"Inst\" R c;"},
+        {"INST a TIG = T1 INST b c;", "dkkk", "INST a TIG = INST b c;"},
         // A quoted name of a list keeps its quotes wherever it moves.
         {"NET a TIG = T1,'T2' T3,'T,4';", "dkdk", "NET a TIG = 'T2','T,4';"},
         {"NET a TIG | TNM = \"g\";", "rk", "NET a TIG = R | TNM = \"g\";"},

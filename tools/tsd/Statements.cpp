@@ -860,6 +860,14 @@ private:
 
 // --- Writer -----------------------------------------------------------------
 
+bool isStatementKeyword(std::string_view word) {
+    for (std::string_view keyword :
+         {"TIMESPEC", "TIMEGRP", "OFFSET", "ENABLE", "DISABLE", "NET", "INST", "PIN"})
+        if (equalsNoCase(word, keyword))
+            return true;
+    return false;
+}
+
 struct Edit {
     std::size_t begin = 0;
     std::size_t end = 0;
@@ -913,11 +921,12 @@ private:
     void writeStatement(const Statement& statement) {
         std::size_t first = statement.firstRecord;
         std::size_t last = first + statement.recordCount;
+        const std::vector<bool> toLineStart = namesToLineStart(statement);
         bool anyKept = false;
         for (std::size_t r = first; r < last; ++r) {
             if (kept(r)) {
                 anyKept = true;
-                replaceValue(m_file.records[r], m_outputs[r].value);
+                replaceValue(m_file.records[r], m_outputs[r].value, toLineStart[r - first]);
             }
         }
         bool othersStand =
@@ -947,6 +956,27 @@ private:
             }
         }
         removeFromList(spans, dropped);
+    }
+
+    // Per record of the statement: a name of a list that the names dropped
+    // before it bring to the start of a line, where a statement keyword
+    // would begin a new statement.
+    std::vector<bool> namesToLineStart(const Statement& statement) const {
+        std::vector<bool> marks(statement.recordCount, false);
+        for (const StatementItem& item : statement.items) {
+            std::size_t firstKept = item.firstRecord;
+            const std::size_t end = item.firstRecord + item.recordCount;
+            while (firstKept < end && !kept(firstKept))
+                ++firstKept;
+            if (firstKept == item.firstRecord || firstKept == end)
+                continue;
+            std::size_t at = m_file.records[item.firstRecord].valueBegin;
+            while (at > 0 && (m_text[at - 1] == ' ' || m_text[at - 1] == '\t'))
+                --at;
+            if (at == 0 || m_text[at - 1] == '\n' || m_text[at - 1] == '\r')
+                marks[firstKept - statement.firstRecord] = true;
+        }
+        return marks;
     }
 
     // Removes each run of dropped entries with the separator on one side:
@@ -1037,7 +1067,9 @@ private:
         }
     }
 
-    void replaceValue(const StatementRecord& record, std::string_view canonical) {
+    // `lineStart`: the value comes to the start of a line, where a bare
+    // statement keyword is written in quotes.
+    void replaceValue(const StatementRecord& record, std::string_view canonical, bool lineStart) {
         // Constraint text is read without blanks around it; names are exact.
         while (record.form != ValueForm::Name && !canonical.empty() &&
                (canonical.front() == ' ' || canonical.front() == '\t'))
@@ -1045,11 +1077,16 @@ private:
         while (record.form != ValueForm::Name && !canonical.empty() &&
                (canonical.back() == ' ' || canonical.back() == '\t'))
             canonical.remove_suffix(1);
-        if (canonical == record.prop.value)
+        const std::string_view raw =
+            m_text.substr(record.valueBegin, record.valueEnd - record.valueBegin);
+        const bool keywordToLineStart = lineStart && isStatementKeyword(raw);
+        if (canonical == record.prop.value && !keywordToLineStart)
             return;
         Edit edit;
         if (!renderValue(record, canonical, edit.with))
             return;
+        if (lineStart && isStatementKeyword(edit.with))
+            edit.with = '"' + edit.with + '"';
         edit.begin = record.valueBegin;
         edit.end = record.valueEnd;
         // Comments inside the old value follow the new one, each on its line.
@@ -1073,14 +1110,6 @@ private:
     const std::vector<RecordOutput>& m_outputs;
     std::vector<Edit> m_edits;
 };
-
-bool isStatementKeyword(std::string_view word) {
-    for (std::string_view keyword :
-         {"TIMESPEC", "TIMEGRP", "OFFSET", "ENABLE", "DISABLE", "NET", "INST", "PIN"})
-        if (equalsNoCase(word, keyword))
-            return true;
-    return false;
-}
 
 } // namespace
 
