@@ -973,7 +973,7 @@ private:
             std::size_t at = m_file.records[item.firstRecord].valueBegin;
             while (at > 0 && (m_text[at - 1] == ' ' || m_text[at - 1] == '\t'))
                 --at;
-            if (at == 0 || m_text[at - 1] == '\n' || m_text[at - 1] == '\r')
+            if (at == 0 || m_text[at - 1] == '\n')
                 marks[firstKept - statement.firstRecord] = true;
         }
         return marks;
